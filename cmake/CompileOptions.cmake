@@ -1,0 +1,13 @@
+# What every target of the project is compiled and linked with.
+
+function(pelm_compile_options target)
+  target_compile_options(${target} PRIVATE -Wall -Wextra -Wshadow -Wconversion)
+  if(PELM_WARNINGS_AS_ERRORS)
+    target_compile_options(${target} PRIVATE -Werror)
+  endif()
+endfunction()
+
+if(PELM_SANITIZE)
+  add_compile_options(-fsanitize=${PELM_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  add_link_options(-fsanitize=${PELM_SANITIZE})
+endif()

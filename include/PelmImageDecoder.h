@@ -1,0 +1,151 @@
+/*
+ * Still-image decoders for BMP, WBMP, PNG and GIF: the caller-owned records and the public calls.
+ *
+ * A decode is one request (ImageDecodeInfo) that names an input (InputSource), an output format, a rotation and a
+ * placement; a call decodes it straight into a buffer of the caller. Zero both records before the first use.
+ * The library allocates, reads and polls only through the host services that PelmHost.h declares.
+ *
+ * Every call runs on the caller's thread. Decodes with separate requests and sources never disturb each other.
+ */
+#ifndef PELM_IMAGE_DECODER_H
+#define PELM_IMAGE_DECODER_H
+
+#include <stdint.h>
+
+#if defined(__GNUC__)
+#define PELM_API __attribute__((visibility("default")))
+#else
+#define PELM_API
+#endif
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/* What a public call returns. */
+enum {
+    PELM_RESULT_FAILED = 0,     /* bad or unsupported input, no input, or no memory */
+    PELM_RESULT_DONE = 1,       /* the image, or the rows asked for, have been written */
+    PELM_RESULT_LAST_FRAME = 3, /* animated GIF: the last frame has been delivered */
+    PELM_RESULT_MORE = 4,       /* iterative calls: rows were written and more remain */
+    PELM_RESULT_DATA_ENDED = 5  /* BMP line call: a read gave nothing although the source holds more */
+};
+
+/* How the decoders reach the encoded bytes: InputSource.kind. */
+enum {
+    PELM_SOURCE_STREAM = 0,     /* read and seek services */
+    PELM_SOURCE_MEMORY = 1,     /* `size` bytes at `data`, read in place */
+    PELM_SOURCE_STREAM_ALT = 2, /* the same as 0 */
+    PELM_SOURCE_SEQUENTIAL = 4  /* read service only: never moved back while rows are decoded */
+};
+
+/*
+ * Output pixel formats: ImageDecodeInfo.outputFormat. Named in the order of bytes in memory, except for the 16-bit
+ * ones, which are values in native byte order. BMP writes 0, 1, 5, 6, 7 and 8. A code that a decoder does not
+ * write is not refused: the call succeeds and the output stays as it was.
+ */
+enum {
+    PELM_FORMAT_RGB565 = 0,    /* 2 bytes: (R >> 3) << 11 | (G >> 2) << 5 | (B >> 3) */
+    PELM_FORMAT_RGB888 = 1,    /* 3 bytes: R, G, B */
+    PELM_FORMAT_ARGB8888 = 5,  /* 4 bytes: alpha, R, G, B */
+    PELM_FORMAT_RGB565_A8 = 6, /* 3 bytes: RGB565 low byte, RGB565 high byte, alpha */
+    PELM_FORMAT_RGBA8888 = 7,  /* 4 bytes: R, G, B, alpha */
+    PELM_FORMAT_BGRA8888 = 8,  /* 4 bytes: B, G, R, alpha */
+    PELM_FORMAT_BGR565 = 10,   /* 2 bytes: (B >> 3) << 11 | (G >> 2) << 5 | (R >> 3); GIF only */
+    PELM_FORMAT_BGR888 = 11,   /* 3 bytes: B, G, R; GIF only */
+    PELM_FORMAT_BGRX8888 = 12  /* 4 bytes: B, G, R, 255; GIF only */
+};
+
+/* ImageDecodeInfo.flags: one rotation, clockwise, and one placement. */
+enum {
+    PELM_ROTATE_0 = 0x0,
+    PELM_ROTATE_90 = 0x4,
+    PELM_ROTATE_180 = 0x8,
+    PELM_ROTATE_270 = 0xC,
+    PELM_ROTATE_MASK = 0xC,
+
+    PELM_PLACE_FIT = 0x000,     /* reduce to fit the box (never enlarge), keep the aspect, centre */
+    PELM_PLACE_EXACT = 0x100,   /* reduce as for FIT; the buffer holds exactly the scaled image */
+    PELM_PLACE_STRETCH = 0x700, /* exactly the box, both ways, without keeping the aspect */
+    PELM_PLACE_MASK = 0x700,
+
+    PELM_INTERLACE_FRAME = 0x1000, /* PNG: collect an interlaced image in a whole-frame buffer before writing it */
+    PELM_INTERLACE_MASK = 0x3000
+};
+
+/*
+ * Where the encoded bytes come from. Owned by the caller, shared with the host services. On a 32-bit system every
+ * field is one 32-bit word, in this order.
+ */
+typedef struct InputSource {
+    uint32_t kind;        /* PELM_SOURCE_ */
+    uint8_t *data;        /* kind 1: the caller's bytes. Kinds 0 and 2: a staging buffer that the library allocates
+                             and frees; the caller neither sets nor frees it */
+    void *hostContext;    /* the host services' own */
+    int32_t size;         /* bytes at `data` (kind 1), or in the whole stream */
+    int32_t consumed;     /* bytes delivered so far, written by the host services. A read that gives nothing while
+                             consumed == size is an end of data, otherwise a failed read */
+    int32_t hostPosition; /* the host services' own */
+    int32_t bufferSize;   /* kinds 0, 2 and 4: proposed size of the buffer for row reads, in bytes. BMP rounds it
+                             down to whole rows, or up to one, and writes it back (kinds 0 and 2) */
+} InputSource;
+
+/*
+ * One decode request. Owned by the caller; on a 32-bit system every field is one 32-bit word, in this order.
+ * The caller sets `input`, `outputFormat` and `flags`; the rest is the library's.
+ */
+typedef struct ImageDecodeInfo {
+    InputSource *input;
+    uint32_t outputFormat; /* PELM_FORMAT_ */
+    uint32_t flags;        /* PELM_ROTATE_ | PELM_PLACE_ | PELM_INTERLACE_FRAME */
+    uint32_t reserved3;
+    uint32_t reserved4;
+    int32_t imageWidth; /* stored image, in pixels */
+    int32_t imageHeight;
+    int32_t outputWidth; /* image after scaling, in pixels, measured in the image's own orientation */
+    int32_t outputHeight;
+    uint32_t decodeStarted; /* 1 once a decode has begun */
+    uint32_t preInitMode;
+    uint32_t reserved11;
+    uint32_t reserved12;
+    uint32_t reserved13;
+    uint32_t hasTransparency; /* GIF: 1 when the frame uses a transparent colour */
+    void *decoderState;       /* the format's own state between calls; NULL when no decode is in progress */
+    uint32_t reserved16;
+    uint32_t iterative;       /* PNG: 1 during iterative calls */
+    uint32_t frameDelay;      /* animated GIF: delay of the current frame in milliseconds */
+    uint32_t colorTableState; /* animated GIF: 1 when the current frame has a colour table of its own */
+    void *globalColorTable;   /* animated GIF: 1024 bytes */
+    void *localColorTable;    /* animated GIF: 1024 bytes */
+} ImageDecodeInfo;
+
+/*
+ * All decode calls: `output` is a buffer of outWidth x outHeight pixels of the output format, top row first, without
+ * padding between rows and with any alignment. In placement PELM_PLACE_EXACT it is instead exactly as large as the
+ * scaled image. Pixels that the image does not cover keep their contents, and nothing is written outside the
+ * buffer. A NULL `info` gives 0; with a NULL `output` the decode runs and writes nothing.
+ */
+
+/*
+ * Decodes a whole BMP. Accepted: headers of 12, 40 and 56 to 64 bytes; 1, 4, 8, 16, 24 and 32 bits per pixel;
+ * uncompressed, and bit fields at 16 bits. docs/formats.md lists what is refused.
+ * Returns PELM_RESULT_DONE (also for a truncated pixel array: the rows that are missing are not written) or
+ * PELM_RESULT_FAILED. `decoderState` is NULL afterwards.
+ */
+PELM_API int32_t ZOTARPELMI_DecodeBMP(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight);
+
+/* Frees the BMP state record that a decode in progress left in `decoderState`, and its palette; nothing else that
+ * hangs from it. Returns 1, or 0 for a NULL `info`. */
+PELM_API int32_t PELMI_BMP_DestroyBMP(ImageDecodeInfo *info);
+
+/* The animated-GIF words of the request; 0 or NULL for a NULL `info`. */
+PELM_API uint32_t ZOTARPELMI_GetAGIFDelayTime(const ImageDecodeInfo *info);
+PELM_API uint32_t ZOTARPELMI_GetAGIFColorTableState(const ImageDecodeInfo *info);
+PELM_API void *ZOTARPELMI_GetAGIFGlobalColorTable(const ImageDecodeInfo *info);
+PELM_API void *ZOTARPELMI_GetAGIFLocalColorTable(const ImageDecodeInfo *info);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif
