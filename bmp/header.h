@@ -1,0 +1,35 @@
+// The first 54 bytes of a BMP: which variants are accepted, and what they say of the image.
+#pragma once
+
+#include "frame/host.h"
+
+namespace pelm {
+
+constexpr int32_t bmp_header_bytes = 54;
+
+// How a step of the set-up ended. `abandoned`: the decode is refused like `refused`, but what has been allocated stays.
+enum class SetUp : uint8_t { done, refused, abandoned };
+
+struct BmpHeader {
+    int32_t width;  // above 0
+    int32_t height; // absolute
+    bool top_down;
+    uint16_t bits_per_pixel;
+    uint32_t compression;
+    uint32_t pixel_data_offset;
+};
+
+// Bytes of a stored row: whole bytes, padded to a multiple of 4. width x bits fits int32.
+constexpr int32_t row_stride(int32_t width, int32_t bits_per_pixel) {
+    return static_cast<int32_t>(((static_cast<int64_t>(width) * bits_per_pixel + 7) / 8 + 3) & ~int64_t{3});
+}
+
+// The same without the padding.
+constexpr int32_t row_bytes(int32_t width, int32_t bits_per_pixel) {
+    return static_cast<int32_t>((static_cast<int64_t>(width) * bits_per_pixel + 7) / 8);
+}
+
+SetUp read_header(InputSource &input, uint8_t (&bytes)[bmp_header_bytes]);
+SetUp parse_header(const uint8_t (&bytes)[bmp_header_bytes], BmpHeader &header);
+
+} // namespace pelm

@@ -1,0 +1,48 @@
+// The depths with a palette: 1, 4 and 8 bits per pixel.
+#include "bmp/decode_rows.h"
+#include "bmp/working.h"
+
+using namespace pelm;
+
+namespace {
+
+template <int32_t depth>
+void write_indexed(const uint8_t *row, void *output, int32_t count, int32_t pixel_step, const uint8_t *palette,
+                   uint32_t format) {
+    write_row_as(format, IndexedRow<depth>{row, palette}, 0, count, static_cast<uint8_t *>(output),
+                 static_cast<ptrdiff_t>(pixel_step) * pixel_step_unit(format));
+}
+
+} // namespace
+
+int32_t PELMI_BMP_Decode1bitBMP(BmpState *state, intptr_t outputCursor, int32_t rows) {
+    return decode_rows(*state, outputCursor, rows, IndexedRow<1>{nullptr, state->palette});
+}
+
+int32_t PELMI_BMP_Decode4bitBMP(BmpState *state, intptr_t outputCursor, int32_t rows) {
+    return decode_rows(*state, outputCursor, rows, IndexedRow<4>{nullptr, state->palette});
+}
+
+int32_t PELMI_BMP_Decode8bitBMP(BmpState *state, intptr_t outputCursor, int32_t rows) {
+    return decode_rows(*state, outputCursor, rows, IndexedRow<8>{nullptr, state->palette});
+}
+
+BmpStop PELMI_BMP_Write1bitOutput(const uint8_t *row, void *output, int32_t count, int32_t pixelStep,
+                                  const uint8_t *palette, uint32_t outputFormat) {
+    write_indexed<1>(row, output, count, pixelStep, palette, outputFormat);
+    const int32_t written = bytes_per_pixel(outputFormat) == 0 || count < 0 ? 0 : count;
+    const ptrdiff_t bytes = static_cast<ptrdiff_t>(pixelStep) * pixel_step_unit(outputFormat) * written;
+    // The place behind the last pixel may lie outside the buffer: it is counted as an address, not as a pointer.
+    const uintptr_t stop = reinterpret_cast<uintptr_t>(output) + static_cast<uintptr_t>(bytes);
+    return {row + written / 8, reinterpret_cast<uint8_t *>(stop)};
+}
+
+void PELMI_BMP_Write4bitOutput(const uint8_t *row, void *output, int32_t count, int32_t pixelStep,
+                               const uint8_t *palette, uint32_t outputFormat) {
+    write_indexed<4>(row, output, count, pixelStep, palette, outputFormat);
+}
+
+void PELMI_BMP_Write8bitOutput(const uint8_t *row, void *output, int32_t count, int32_t pixelStep,
+                               const uint8_t *palette, uint32_t outputFormat) {
+    write_indexed<8>(row, output, count, pixelStep, palette, outputFormat);
+}

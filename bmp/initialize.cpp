@@ -1,0 +1,138 @@
+// From a request to a record that is ready to decode: header, colours, size and place in the output, buffers.
+#include <limits>
+
+#include "bmp/colours.h"
+#include "bmp/header.h"
+#include "bmp/scaling.h"
+#include "bmp/working.h"
+#include "frame/formats.h"
+#include "frame/sizes.h"
+
+namespace pelm {
+namespace {
+
+// The steps from pixel to pixel, in the record's units. False when they do not fit it.
+bool place_in_output(BmpState &state, Size buffer, Size scaled) {
+    const int32_t pixel_bytes = bytes_per_pixel(state.outputFormat);
+    const Placement placement = place(state.rotation, buffer, scaled);
+
+    // Far below the range of 64 bits, so that a walk over all rows from there cannot leave it either.
+    constexpr int64_t farthest = std::numeric_limits<intptr_t>::max() / 2;
+    const int64_t first_limit = farthest / pixel_bytes;
+    if (placement.first > first_limit || placement.first < -first_limit) return false;
+    state.outputCursor = static_cast<intptr_t>(placement.first * pixel_bytes);
+
+    const int64_t row_step = placement.row_step * pixel_bytes * (state.topDown != 0 ? -1 : 1);
+    const int64_t pixel_step = placement.pixel_step * pixel_bytes / pixel_step_unit(state.outputFormat);
+    if (!fits_int32(row_step) || !fits_int32(pixel_step)) return false;
+    state.rowStep = static_cast<int32_t>(row_step);
+    state.pixelStep = static_cast<int32_t>(pixel_step);
+    return true;
+}
+
+SetUp set_geometry(BmpState &state, ImageDecodeInfo &info, Size box, void *output) {
+    const uint32_t mode = placement_mode(info.flags);
+    state.rotation = rotation_of(info.flags);
+    state.requestedWidth = box.width;
+    info.decodeStarted = 1;
+
+    const Size box_for_image = turns_sideways(state.rotation) ? Size{box.height, box.width} : box;
+    Scaling scaling{};
+    if (!scale_to_box({state.width, state.height}, box_for_image, mode == PELM_PLACE_STRETCH, scaling))
+        return SetUp::refused;
+    state.scaledWidth = scaling.size.width;
+    state.scaledHeight = scaling.size.height;
+    state.oneToOne = scaling.one_to_one ? 1 : 0;
+
+    // Required: an exact buffer has the unturned sides of the scaled image, also when it is turned (docs/oddities.md,
+    // "Exact placement of turned images").
+    const Size buffer = mode == PELM_PLACE_EXACT ? scaling.size : box;
+    state.outputFormat = info.outputFormat;
+    size_t bytes = 0;
+    if (!buffer_bytes(buffer.width, buffer.height, bytes_per_pixel(state.outputFormat), bytes)) return SetUp::refused;
+    if (bytes == 0 || state.scaledWidth <= 0 || state.scaledHeight <= 0) return SetUp::done; // nothing will be written
+    state.output = {static_cast<uint8_t *>(output), output == nullptr ? 0 : bytes};
+    return place_in_output(state, buffer, scaling.size) ? SetUp::done : SetUp::refused;
+}
+
+bool allocate_staging(BmpState &state, InputSource &input) {
+    if (input.kind != PELM_SOURCE_STREAM && input.kind != PELM_SOURCE_STREAM_ALT) return true;
+    const int32_t stride = row_stride(state.width, state.bitsPerPixel);
+    input.bufferSize = input.bufferSize < stride ? stride : input.bufferSize / stride * stride;
+    input.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(input.bufferSize)));
+    return input.data != nullptr;
+}
+
+// Two rows by contract, although the scan of frame/sampling.h's sample lines never has more than one open.
+bool allocate_accumulators(BmpState &state) {
+    if (state.scaledWidth <= 0) return true;
+    const int64_t bytes = int64_t{state.scaledWidth} * 8;
+    if (bytes > std::numeric_limits<uint32_t>::max()) return false;
+    state.accumulators = static_cast<uint32_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(bytes)));
+    if (state.accumulators == nullptr) return false;
+    ZOTARPELM_OsMemset(state.accumulators, 0, static_cast<uint32_t>(bytes));
+    return true;
+}
+
+SetUp set_up(BmpState &state, ImageDecodeInfo &info, Size box, void *output) {
+    InputSource &input = *info.input;
+    uint8_t bytes[bmp_header_bytes];
+    BmpHeader header{};
+    SetUp step = read_header(input, bytes);
+    if (step == SetUp::done) step = parse_header(bytes, header);
+    if (step != SetUp::done) return step;
+
+    state.width = header.width;
+    state.height = header.height;
+    state.topDown = header.top_down ? 1 : 0;
+    state.bitsPerPixel = header.bits_per_pixel;
+    state.pixelDataOffset = header.pixel_data_offset;
+    step = read_colours(state, header, input);
+    if (step == SetUp::done) step = set_geometry(state, info, box, output);
+    if (step != SetUp::done) return step;
+
+    state.input = &input; // from here on the staging buffer is the record's to free
+    return allocate_staging(state, input) && allocate_accumulators(state) ? SetUp::done : SetUp::refused;
+}
+
+} // namespace
+} // namespace pelm
+
+BmpState *PELMI_BMP_Initialize(ImageDecodeInfo *info, int32_t outWidth, int32_t outHeight, void *output) {
+    if (info == nullptr || info->input == nullptr) return nullptr;
+    auto *const state = static_cast<BmpState *>(ZOTARPELM_OsMalloc(sizeof(BmpState)));
+    if (state == nullptr) return nullptr;
+    ZOTARPELM_OsMemset(state, 0, sizeof(BmpState));
+
+    switch (pelm::set_up(*state, *info, {outWidth, outHeight}, output)) {
+    case pelm::SetUp::done: break;
+    case pelm::SetUp::refused: PELMI_BMP_DeleteDecInfo(state); return nullptr;
+    case pelm::SetUp::abandoned: return nullptr;
+    }
+    info->outputWidth = state->scaledWidth;
+    info->outputHeight = state->scaledHeight;
+    info->decoderState = state;
+    return state;
+}
+
+void PELMI_BMP_DeleteDecInfo(BmpState *state) {
+    if (state == nullptr) return;
+    InputSource *const input = state->input;
+    const bool staged =
+        input != nullptr && (input->kind == PELM_SOURCE_STREAM || input->kind == PELM_SOURCE_STREAM_ALT);
+    if (staged && input->data != nullptr) ZOTARPELM_OsFree(input->data);
+    if (staged) input->data = nullptr;
+    if (state->palette != nullptr) ZOTARPELM_OsFree(state->palette);
+    if (state->accumulators != nullptr) ZOTARPELM_OsFree(state->accumulators);
+    ZOTARPELM_OsFree(state);
+}
+
+int32_t PELMI_BMP_DestroyBMP(ImageDecodeInfo *info) {
+    if (info == nullptr) return 0;
+    auto *const state = static_cast<BmpState *>(info->decoderState);
+    if (state == nullptr) return 1;
+    if (state->palette != nullptr) ZOTARPELM_OsFree(state->palette);
+    ZOTARPELM_OsFree(state);
+    info->decoderState = nullptr;
+    return 1;
+}

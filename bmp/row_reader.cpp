@@ -1,0 +1,100 @@
+#include "bmp/row_reader.h"
+
+#include <algorithm>
+#include <limits>
+
+#include "bmp/header.h"
+#include "frame/host.h"
+
+namespace pelm {
+namespace {
+
+int64_t offset_of(const RowReader &reader, int32_t index) {
+    return reader.first_row_offset + int64_t{reader.stride} * index;
+}
+
+const uint8_t *row_in_memory(RowReader &reader, int32_t index) {
+    const int64_t offset = offset_of(reader, index);
+    const int64_t end = reader.input->size;
+    if (offset + reader.bytes_needed > end || offset + reader.bytes_behind >= end) {
+        reader.result = PELM_RESULT_DONE;
+        return nullptr;
+    }
+    reader.current = index;
+    return reader.row = reader.input->data + static_cast<ptrdiff_t>(offset);
+}
+
+// Reads on until a whole row is held. What a row does not fill when the data ends is dropped.
+bool hold_a_row(RowReader &reader) {
+    while (reader.held < reader.stride) {
+        if (reader.start != 0 && reader.held != 0)
+            ZOTARPELM_OsMemcpy(reader.buffer, reader.buffer + reader.start, static_cast<uint32_t>(reader.held));
+        reader.start = 0;
+        const int32_t room = reader.capacity - reader.held;
+        const int32_t got = ZOTARPELM_Read_IO(reader.input, reader.buffer + reader.held, room);
+        if (got < 1) {
+            reader.result = reader.input->consumed == reader.input->size ? PELM_RESULT_DONE : PELM_RESULT_DATA_ENDED;
+            return false;
+        }
+        reader.held += std::min(got, room);
+    }
+    return true;
+}
+
+const uint8_t *row_in_stream(RowReader &reader, int32_t index) {
+    while (reader.current < index) {
+        if (reader.row != nullptr) {
+            reader.start += reader.stride;
+            reader.held -= reader.stride;
+            reader.row = nullptr;
+        }
+        if (!hold_a_row(reader)) return nullptr;
+        reader.row = reader.buffer + reader.start;
+        ++reader.current;
+    }
+    return reader.row;
+}
+
+} // namespace
+
+bool open_rows(RowReader &reader, const BmpState &state, int32_t first) {
+    reader = {};
+    reader.input = state.input;
+    reader.stride = row_stride(state.width, state.bitsPerPixel);
+    reader.current = first - 1;
+    reader.first_row_offset = state.pixelDataOffset;
+
+    switch (state.input->kind) {
+    case PELM_SOURCE_MEMORY:
+        // Pixel for pixel a row counts only with its padding; scaled it may lack that, but not begin in the last two
+        // bytes of the file.
+        reader.bytes_needed = state.oneToOne != 0 ? reader.stride : row_bytes(state.width, state.bitsPerPixel);
+        reader.bytes_behind = state.oneToOne != 0 ? 0 : 2;
+        return true;
+    case PELM_SOURCE_SEQUENTIAL:
+        reader.capacity = std::max(state.input->bufferSize, reader.stride);
+        reader.buffer = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(reader.capacity)));
+        reader.owns_buffer = true;
+        return reader.buffer != nullptr;
+    default: {
+        // A place that the position's 32 bits cannot name lies behind the end of any stream.
+        constexpr int64_t farthest = std::numeric_limits<int32_t>::max();
+        const int64_t offset = std::min(offset_of(reader, first), farthest);
+        ZOTARPELM_Seek_IO(state.input, static_cast<int32_t>(offset), 0);
+        reader.capacity = state.input->bufferSize;
+        reader.buffer = state.input->data;
+        return true;
+    }
+    }
+}
+
+const uint8_t *read_row(RowReader &reader, int32_t index) {
+    if (reader.row != nullptr && reader.current == index) return reader.row;
+    return reader.input->kind == PELM_SOURCE_MEMORY ? row_in_memory(reader, index) : row_in_stream(reader, index);
+}
+
+void close_rows(RowReader &reader) {
+    if (reader.owns_buffer && reader.buffer != nullptr) ZOTARPELM_OsFree(reader.buffer);
+}
+
+} // namespace pelm

@@ -1,0 +1,38 @@
+// Where an image goes in the caller's buffer: rotation, size after scaling, position of its first pixel and the steps
+// from there.
+#pragma once
+
+#include <cstdint>
+
+#include "PelmImageDecoder.h"
+
+namespace pelm {
+
+struct Size {
+    int32_t width, height; // pixels
+};
+
+// Clockwise degrees: 0, 90, 180 or 270.
+constexpr int32_t rotation_of(uint32_t flags) {
+    return static_cast<int32_t>((flags & PELM_ROTATE_MASK) >> 2) * 90;
+}
+
+constexpr bool turns_sideways(int32_t rotation) {
+    return rotation == 90 || rotation == 270;
+}
+
+constexpr uint32_t placement_mode(uint32_t flags) {
+    return flags & PELM_PLACE_MASK;
+}
+
+// All in pixels of the buffer, counted through linear memory.
+struct Placement {
+    int64_t first;      // index of the image's first pixel; may lie outside the buffer
+    int64_t row_step;   // to the image's next row
+    int64_t pixel_step; // to the next pixel of a row
+};
+
+// Centres an image of size `scaled` (in its own orientation) in a buffer, rounding the margins down.
+Placement place(int32_t rotation, Size buffer, Size scaled);
+
+} // namespace pelm

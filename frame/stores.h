@@ -1,0 +1,66 @@
+// How one pixel of each output format lies in memory.
+#pragma once
+
+#include "frame/bytes.h"
+#include "frame/pixel.h"
+
+namespace pelm {
+
+struct StoreRgb565 {
+    static constexpr int32_t size = 2;
+    template <class Pixel>
+    static void put(uint8_t *at, Pixel pixel) {
+        store_u16(at, rgb565_of(pixel));
+    }
+};
+
+struct StoreRgb888 {
+    static constexpr int32_t size = 3;
+    template <class Pixel>
+    static void put(uint8_t *at, Pixel pixel) {
+        const Rgb c = channels_of(pixel);
+        at[0] = c.r;
+        at[1] = c.g;
+        at[2] = c.b;
+    }
+};
+
+struct StoreArgb8888 {
+    static constexpr int32_t size = 4;
+    template <class Pixel>
+    static void put(uint8_t *at, Pixel pixel) {
+        const Rgb c = channels_of(pixel);
+        store_4(at, alpha_of(pixel), c.r, c.g, c.b);
+    }
+};
+
+struct StoreRgb565A8 {
+    static constexpr int32_t size = 3;
+    template <class Pixel>
+    static void put(uint8_t *at, Pixel pixel) {
+        const uint16_t value = rgb565_with_alpha_of(pixel);
+        at[0] = static_cast<uint8_t>(value);
+        at[1] = static_cast<uint8_t>(value >> 8);
+        at[2] = alpha_of(pixel);
+    }
+};
+
+struct StoreRgba8888 {
+    static constexpr int32_t size = 4;
+    template <class Pixel>
+    static void put(uint8_t *at, Pixel pixel) {
+        const Rgb c = channels_of(pixel);
+        store_4(at, c.r, c.g, c.b, alpha_of(pixel));
+    }
+};
+
+struct StoreBgra8888 {
+    static constexpr int32_t size = 4;
+    template <class Pixel>
+    static void put(uint8_t *at, Pixel pixel) {
+        const Rgb c = channels_of(pixel);
+        store_4(at, c.b, c.g, c.r, alpha_of(pixel));
+    }
+};
+
+} // namespace pelm

@@ -1,0 +1,57 @@
+// Source layout x output format x direction: one row loop combines them.
+//
+// A `Load` is a source row: load(x) gives the pixel in column x, in any type that frame/pixel.h's questions have
+// answers for. A store is one of frame/stores.h.
+#pragma once
+
+#include <cstddef>
+#include <type_traits>
+
+#include "frame/clip.h"
+#include "frame/formats.h"
+#include "frame/stores.h"
+
+namespace pelm {
+
+template <class Store, class Load, class Step>
+inline void write_run(const Load &load, int32_t from, int32_t count, uint8_t *__restrict out, Step step) {
+    for (ptrdiff_t i = 0; i < count; ++i)
+        Store::put(out + i * step, load(from + static_cast<int32_t>(i)));
+}
+
+// Columns from .. from + count - 1, the first one to `out`, `step` bytes apart.
+template <class Store, class Load>
+inline void write_run_as(const Load &load, int32_t from, int32_t count, uint8_t *out, ptrdiff_t step) {
+    if (step == Store::size)
+        write_run<Store>(load, from, count, out, std::integral_constant<ptrdiff_t, Store::size>());
+    else
+        write_run<Store>(load, from, count, out, step);
+}
+
+// This switch is the list of formats that the full-colour decoders write; any other code writes nothing.
+template <class Load>
+void write_row_as(uint32_t format, const Load &load, int32_t from, int32_t count, uint8_t *out, ptrdiff_t step) {
+    switch (format) {
+    case PELM_FORMAT_RGB565: return write_run_as<StoreRgb565>(load, from, count, out, step);
+    case PELM_FORMAT_RGB888: return write_run_as<StoreRgb888>(load, from, count, out, step);
+    case PELM_FORMAT_ARGB8888: return write_run_as<StoreArgb8888>(load, from, count, out, step);
+    case PELM_FORMAT_RGB565_A8: return write_run_as<StoreRgb565A8>(load, from, count, out, step);
+    case PELM_FORMAT_RGBA8888: return write_run_as<StoreRgba8888>(load, from, count, out, step);
+    case PELM_FORMAT_BGRA8888: return write_run_as<StoreBgra8888>(load, from, count, out, step);
+    default: return;
+    }
+}
+
+// The same for a row that starts at byte `position` of a buffer: pixels that do not lie wholly inside are dropped.
+template <class Load>
+void write_row_clipped(const OutputBuffer &buffer, int64_t position, int64_t step, uint32_t format, const Load &load,
+                       int32_t count) {
+    const int32_t size = bytes_per_pixel(format);
+    if (size == 0) return;
+    const Run inside = clip_run(position, step, count, size, buffer.size);
+    if (inside.count == 0) return;
+    uint8_t *const first = buffer.start + static_cast<ptrdiff_t>(position + inside.first * step);
+    write_row_as(format, load, static_cast<int32_t>(inside.first), inside.count, first, static_cast<ptrdiff_t>(step));
+}
+
+} // namespace pelm
