@@ -1,0 +1,28 @@
+#include "bench/stb_peer.h"
+
+#if defined(__GNUC__)
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wunused-function"
+#pragma GCC diagnostic ignored "-Wconversion"
+#pragma GCC diagnostic ignored "-Wshadow"
+#endif
+#define STB_IMAGE_STATIC
+#define STB_IMAGE_IMPLEMENTATION
+#include <stb/stb_image.h>
+#if defined(__GNUC__)
+#pragma GCC diagnostic pop
+#endif
+
+namespace bench {
+
+bool stb_decode_rgba(const std::vector<uint8_t> &file) {
+    int width = 0;
+    int height = 0;
+    int channels = 0;
+    stbi_uc *const pixels =
+        stbi_load_from_memory(file.data(), static_cast<int>(file.size()), &width, &height, &channels, 4);
+    stbi_image_free(pixels);
+    return pixels != nullptr;
+}
+
+} // namespace bench
