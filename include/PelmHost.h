@@ -54,36 +54,38 @@ PELM_API void ZOTARPELM_OsSleep(int32_t status);
  */
 enum { PELM_HOST_BUFFER_SIZE = 65536 };
 
-/* `size` bytes of the caller's, as a source of any kind. Borrowed: they stay the caller's and must outlive the source.
- * PNG decodes from kind 1 may modify them. */
+/* `size` bytes of the caller's, as a source of any kind, with all seeks. Borrowed: they stay the caller's and must
+ * outlive the source. PNG decodes from kind 1 may modify them. */
 PELM_API int PelmHost_OpenMemory(InputSource *source, uint32_t kind, void *bytes, int32_t size);
 
-/* A regular file as a seekable stream (kind 0; a caller may set kind 2). EFBIG above 2^31 - 1 bytes, ESPIPE for what
- * is not a regular file. */
+/* A regular file as a seekable stream (kind 0; a caller may set kind 2). EFBIG above 2^31 - 1 bytes; ESPIPE for what
+ * is not a regular file, which is then left unopened. */
 PELM_API int PelmHost_OpenFile(InputSource *source, const char *path, int32_t bufferSize);
 
 /* A regular file or a pipe, read whole into private memory, as a source of any kind. EFBIG beyond `limit` bytes;
- * a limit of 0 or below means 2^31 - 1. */
+ * a limit of 0 or below means 2^31 - 1. ECANCELED or ETIMEDOUT when the control stops it. */
 PELM_API int PelmHost_OpenFileInMemory(InputSource *source, uint32_t kind, const char *path, int32_t limit);
 
 /*
  * A stdio stream or a file descriptor, from where it stands, as a sequential source (kind 4). Not closed by
  * PelmHost_Close. `size` is 0x7FFFFFFF until the end has been met and the number of bytes delivered from then on. It
- * cannot be moved back: such a seek moves by 0.
+ * cannot be moved back: such a seek moves by 0. EBADF for a descriptor that is not open for reading. A stop asked for
+ * through the control ends a read that waits for a descriptor; one that waits inside stdio, when a signal interrupts
+ * it as well.
  */
 PELM_API int PelmHost_OpenStream(InputSource *source, FILE *stream, int32_t bufferSize);
 PELM_API int PelmHost_OpenDescriptor(InputSource *source, int descriptor, int32_t bufferSize);
 
 /* What is left of a stdio stream, read into private memory, as a source of any kind, with its true size and all
- * seeks. Limits as for PelmHost_OpenFileInMemory. */
+ * seeks. Fails as PelmHost_OpenFileInMemory does; the bytes read by then are lost to the stream. */
 PELM_API int PelmHost_OpenSpooled(InputSource *source, uint32_t kind, FILE *stream, int32_t limit);
 
 /* Releases what the opener took. Never touches `source->data` of kinds 0 and 2, which is the library's. Leaves the
  * record zeroed; NULL and zeroed records are fine. */
 PELM_API void PelmHost_Close(InputSource *source);
 
-/* Why the last read of this source delivered nothing: 0 for an end of data (or no failure at all), ECANCELED or
- * ETIMEDOUT when the control stopped it, otherwise the errno value of the failed read. */
+/* Why the last read of this source delivered less than asked, or nothing: 0 for an end of data (or no failure at all),
+ * ECANCELED or ETIMEDOUT when the control stopped it, otherwise the errno value of the failed read. */
 PELM_API int PelmHost_ReadError(const InputSource *source);
 
 /* ---- The default host library: limits, counters, stopping ---------------------------------------------------- */
@@ -91,7 +93,8 @@ PELM_API int PelmHost_ReadError(const InputSource *source);
 /*
  * A control limits, counts and stops the decodes that run under it. It is installed for the whole process, or for one
  * thread (which then looks at no other). Without one nothing is limited, counted or stopped. All functions may be
- * called from any thread; blocks may be freed under another control than the one that they were allocated under.
+ * called from any thread; a block is always given back to the control that it was allocated under. Every function
+ * accepts a NULL control and then does nothing, or answers 0.
  */
 typedef struct PelmHostControl PelmHostControl;
 
@@ -100,9 +103,11 @@ PELM_API PelmHostControl *PelmHost_NewControl(void); /* NULL without memory; eve
 PELM_API void PelmHost_ReleaseControl(PelmHostControl *control);
 
 PELM_API void PelmHost_UseForProcess(PelmHostControl *control); /* NULL: none */
-PELM_API void PelmHost_UseForThread(PelmHostControl *control);  /* NULL: the one of the process */
+/* NULL: the one of the process. A thread takes its control out before it ends; otherwise the control is never freed. */
+PELM_API void PelmHost_UseForThread(PelmHostControl *control);
 
-/* Most bytes alive at once, and in one allocation; 0 means no limit. What exceeds them is a failed allocation. */
+/* Most bytes alive at once, and in one allocation; 0 means no limit. What exceeds them is a failed allocation. Only
+ * what the decoders allocate is limited and counted, not the private memory of sources. */
 PELM_API void PelmHost_SetMemoryLimits(PelmHostControl *control, uint64_t liveBytes, uint64_t blockBytes);
 
 /* Asks the decodes to stop. Safe in a signal handler and from any thread. Lasts until PelmHost_Resume. */
@@ -113,13 +118,16 @@ PELM_API void PelmHost_Resume(PelmHostControl *control);
 PELM_API void PelmHost_SetDeadline(PelmHostControl *control, uint32_t milliseconds);
 
 /*
- * Called on the decoding thread at every poll (`source` NULL) and after every read of a stream source. Negative stops
- * the decode; positive pauses it by that many milliseconds (polls only); 0 goes on. NULL removes it.
+ * Called on the decoding thread at every poll (`source` NULL) and after every read of a stream source (kinds 0, 2 and
+ * 4), unless the control stops them already. Negative cancels, as PelmHost_Cancel does: what was just read is still
+ * delivered, later reads and polls are not. Positive pauses by that many milliseconds (polls only); 0 goes on.
+ * Threads that share a control may call it at the same time. NULL removes it, for calls that begin later.
  */
 typedef int32_t (*PelmHostProgress)(void *user, const InputSource *source);
 PELM_API void PelmHost_SetProgress(PelmHostControl *control, PelmHostProgress progress, void *user);
 
-/* Why a decode under this control was told to stop: 0 not at all, ECANCELED, or ETIMEDOUT (deadline). */
+/* Why decodes under this control have to stop now: 0 not at all, ECANCELED, or ETIMEDOUT (deadline passed). A decode
+ * that was done before may have ended well; why a stream source stopped one tells PelmHost_ReadError. */
 PELM_API int PelmHost_StopReason(const PelmHostControl *control);
 
 typedef struct PelmHostCounters {
