@@ -1,0 +1,130 @@
+// Photos and drawings by others, stored as BMP in every accepted way. They lie outside of the repository: where they
+// are missing, the tests say so and pass.
+#include "tests/tool/run_tool.h"
+#include "tests/tool/stored_pixels.h"
+
+#include <cstdlib>
+#include <iostream>
+
+namespace pelm::test {
+namespace {
+
+namespace fs = std::filesystem;
+
+fs::path image_folder() {
+    const char *const chosen = std::getenv("PELM_TEST_IMAGES");
+    return chosen != nullptr ? chosen : PELM_SHARED_IMAGES;
+}
+
+class ToolPhotos : public ToolTest {
+protected:
+    // False, with a message, when there is no such image.
+    static bool is_there(const std::string &name) {
+        if (fs::exists(image_folder() / name)) return true;
+        std::cout << "not tested: there is no " << (image_folder() / name) << "; set PELM_TEST_IMAGES\n";
+        return false;
+    }
+};
+
+uint32_t red(uint32_t pixel) {
+    return pixel >> 24;
+}
+uint32_t green(uint32_t pixel) {
+    return pixel >> 16 & 255;
+}
+uint32_t blue(uint32_t pixel) {
+    return pixel >> 8 & 255;
+}
+
+// The channel's bits that `mask` has room for, at its place.
+uint32_t under_mask(uint32_t channel, uint32_t mask) {
+    uint32_t value = channel << 24;
+    for (uint32_t top = mask; (top & 0x80000000u) == 0; top <<= 1)
+        value >>= 1;
+    return value & mask;
+}
+
+// The pixel as the variant stores it; palette indices are red-green-blue in 3, 3 and 2 bits, or grey.
+uint32_t stored_as(const BmpVariant &variant, uint32_t pixel) {
+    switch (variant.bits) {
+    case 1: return green(pixel) >> 7;
+    case 4: return green(pixel) >> 4;
+    case 8: return red(pixel) >> 5 << 5 | green(pixel) >> 5 << 2 | blue(pixel) >> 6;
+    case 16: break;
+    default: return pixel >> 8;
+    }
+    const std::array<uint32_t, 3> plain = {0x7C00, 0x03E0, 0x001F};
+    const auto &masks = variant.compression == 3 ? variant.masks : plain;
+    return under_mask(red(pixel), masks[0]) | under_mask(green(pixel), masks[1]) | under_mask(blue(pixel), masks[2]);
+}
+
+Bytes palette_for(uint16_t bits) {
+    Bytes palette;
+    for (uint32_t i = 0; bits <= 8 && i < 1u << bits; ++i) {
+        const uint32_t grey = bits == 8 ? 0 : i * 255 / ((1u << bits) - 1);
+        const uint32_t b = bits == 8 ? (i & 3) * 85 : grey;
+        const uint32_t g = bits == 8 ? (i >> 2 & 7) * 255 / 7 : grey;
+        const uint32_t r = bits == 8 ? (i >> 5) * 255 / 7 : grey;
+        for (const uint32_t byte : {b, g, r, 0u})
+            palette.push_back(static_cast<uint8_t>(byte));
+    }
+    return palette;
+}
+
+Bytes as_bmp(const Image &image, const BmpVariant &variant, bool top_down) {
+    Picture picture(image.height);
+    for (size_t y = 0; y < image.height; ++y) {
+        for (size_t x = 0; x < image.width; ++x)
+            picture[y].push_back(stored_as(variant, image.at(x, y)));
+    }
+    BmpFile file;
+    file.width = static_cast<int32_t>(image.width);
+    file.height = static_cast<int32_t>(image.height) * (top_down ? -1 : 1);
+    file.bits = variant.bits;
+    file.compression = variant.compression;
+    if (variant.compression == 3) file.masks.assign(variant.masks.begin(), variant.masks.end());
+    file.palette = palette_for(variant.bits);
+    file.rows = pack_rows(picture, variant.bits, top_down);
+    return file_bytes(file);
+}
+
+TEST_F(ToolPhotos, decode_from_every_depth_to_their_stored_pixels) {
+    for (const std::string name : {"harvesters.png", "hibiscus.regular.png", "hippopotamus.regular.png"}) {
+        if (!is_there(name)) continue;
+        const Image photo = read_png(image_folder() / name);
+        ASSERT_GT(photo.width, 0u) << name;
+        bool top_down = false;
+        for (const BmpVariant &variant : bmp_variants) {
+            const Bytes bmp = as_bmp(photo, variant, top_down);
+            const ToolRun got = run({write("photo.bmp", bmp), "--format", "rgba", "-o", path("photo.png")});
+            EXPECT_EQ(got.status, 0) << name << ", " << variant.name << ": " << got.err;
+            EXPECT_EQ(difference(stored_image(bmp), read_png(path("photo.png"))), "") << name << ", " << variant.name;
+            top_down = !top_down;
+        }
+    }
+}
+
+TEST_F(ToolPhotos, keep_their_colours_at_24_bits) {
+    if (!is_there("harvesters.png")) return;
+    const Image photo = read_png(image_folder() / "harvesters.png");
+    const std::string bmp = write("photo.bmp", as_bmp(photo, variant_named("twenty_four_bits"), false));
+    ASSERT_EQ(run({bmp, "-o", path("photo.png")}).status, 0);
+    EXPECT_EQ(difference(photo, read_png(path("photo.png"))), "");
+}
+
+TEST_F(ToolPhotos, with_long_headers_are_refused_in_one_line) {
+    const struct {
+        const char *name;
+        int header_size;
+    } cases[] = {{"harvesters.bmp", 124},   {"bricks-gray.bmp", 108},        {"bricks-dither.bmp", 124},
+                 {"hippopotamus.bmp", 124}, {"hibiscus.primitive.bmp", 124}, {"pjw-thumbnail.bmp", 124}};
+    for (const auto &one : cases) {
+        if (!is_there(one.name)) continue;
+        const std::string file = (image_folder() / one.name).string();
+        expect_failure({file, "-o", path("x.png")}, file,
+                       "BMP header of " + std::to_string(one.header_size) + " bytes is not supported");
+    }
+}
+
+} // namespace
+} // namespace pelm::test

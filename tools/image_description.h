@@ -1,0 +1,29 @@
+// What the tool tells about an image file from its first bytes, whatever its format.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace pelm_tool {
+
+// How many of a file's first bytes a description may look at.
+constexpr size_t described_bytes = 66;
+
+struct ImageDescription {
+    int32_t width = 0; // as decoded; 0 when the image is refused before it is known
+    int32_t height = 0;
+    std::string words;              // size, depth and variant
+    std::string refusal;            // why the decoder refuses it; empty when it does not
+    std::string shortage;           // what a truncated file lacks; empty when it is whole
+    std::vector<std::string> notes; // what the decoder does with it that a user may not expect
+};
+
+// The file around the first bytes.
+struct FileFacts {
+    int64_t size;         // bytes
+    uint32_t source_kind; // PELM_SOURCE_: some rules depend on it
+};
+
+} // namespace pelm_tool
