@@ -35,8 +35,12 @@ bool resumes(const PngDecodeState &state) {
     return state.rowsDone != 0 && state.resumePoint >= resume_in_stored && state.resumePoint <= resume_at_block;
 }
 
+// The pool of the fixed codes' trees is part of what hosts budget for, and the first allocation that can fail here;
+// the codes themselves are constant tables.
 bool allocate_stream_memory(PngDecodeState &state) {
-    if (!build_fixed_trees(state.inflate, state.fixedHuffmanPool) || !allocate_rows(state)) return false;
+    if (state.fixedHuffmanPool == nullptr)
+        state.fixedHuffmanPool = static_cast<HuffmanNodePool *>(ZOTARPELM_OsMalloc(sizeof(HuffmanNodePool)));
+    if (state.fixedHuffmanPool == nullptr || !allocate_rows(state)) return false;
     if (state.inflate.window.bytes == nullptr)
         state.inflate.window.bytes = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(window_size));
     return state.inflate.window.bytes != nullptr;
@@ -55,16 +59,15 @@ Stop start(PngDecodeState &state, const PngInputBuffer *stream) {
 }
 
 Stop run(PngDecodeState &state, bool streams, PlainRows &rows) {
-    const TreePools pools = {&state.fixedHuffmanPool, &state.dynamicHuffmanPool};
     const bool pause_at_blocks = state.iterativeMode != 0;
     if (streams) {
         StreamInput input = stream_input(state);
-        const Stop stop = inflate(state.inflate, input, rows, pools, pause_at_blocks);
+        const Stop stop = inflate(state.inflate, input, rows, state.dynamicHuffmanPool, pause_at_blocks);
         keep_unread(input);
         return stop;
     }
     MemoryInput input = memory_input(state);
-    const Stop stop = inflate(state.inflate, input, rows, pools, pause_at_blocks);
+    const Stop stop = inflate(state.inflate, input, rows, state.dynamicHuffmanPool, pause_at_blocks);
     state.inputNext = input.next;
     return stop;
 }

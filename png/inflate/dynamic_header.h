@@ -68,10 +68,7 @@ Stop read_dynamic_header(InflateState &state, Input &input, HuffmanNodePool *&po
         if (!take_bits(state.bits, input, 3, length)) return Stop::input_ended;
         code_length_lengths[order[i]] = static_cast<uint8_t>(length);
     }
-    // The trees of the block before go with this one: the tables no longer describe them either.
-    state.lookup_is_fixed = false;
-    pool->nodeCount = 0;
-    pool->capacity = HUFFMAN_POOL_NODES;
+    reset_pool(*pool);
     const HuffmanNode *const root = __PELMI_PngBuildHuffmanTable(code_length_lengths, 19, HUFFMAN_CODE_LENGTH, pool);
     const Stop got =
         take_code_lengths(state, input, pool->nodes, static_cast<uint32_t>(root - pool->nodes), literals + distances);

@@ -48,14 +48,14 @@ Stop read_stored_header(InflateState &now, Input &input) {
 }
 
 template <class Input>
-Stop read_block_header(InflateState &now, Input &input, const TreePools &pools) {
+Stop read_block_header(InflateState &now, Input &input, HuffmanNodePool *&pool) {
     uint32_t bits = 0;
     if (!take_bits(now.bits, input, 3, bits)) return Stop::input_ended;
     now.final_block = (bits & 1) != 0;
     switch (bits >> 1) {
     case 0: return read_stored_header(now, input);
-    case 1: return use_fixed_trees(now, **pools.fixed);
-    case 2: return read_dynamic_header(now, input, *pools.dynamic);
+    case 1: return use_fixed_codes(now);
+    case 2: return read_dynamic_header(now, input, pool);
     default: return Stop::bad_stream;
     }
 }
@@ -86,7 +86,7 @@ Stop read_match(InflateState &now, BitReader &bits, Input &input, Symbol length)
     now.copy_length = length.value + extra;
 
     refill(bits, input);
-    const Symbol distance = find_symbol(now.lookup->distance, now.nodes, bits.bits);
+    const Symbol distance = find_symbol(now.codes->distance, now.nodes, bits.bits);
     if (distance.bits > bits.count) return Stop::input_ended;
     if (distance.op == code_is_missing) return Stop::bad_code;
     drop(bits, distance.bits);
@@ -114,7 +114,7 @@ Stop read_symbols(InflateState &now, Input &input, bool pause_at_blocks) {
         Symbol symbol{};
         do { // literals, as long as they last
             refill(bits, input);
-            symbol = find_symbol(now.lookup->literal, now.nodes, bits.bits);
+            symbol = find_symbol(now.codes->literal, now.nodes, bits.bits);
             if (symbol.op != HUFFMAN_LITERAL || symbol.bits > bits.count) break;
             drop(bits, symbol.bits);
             *out++ = static_cast<uint8_t>(symbol.value);
@@ -138,10 +138,10 @@ Stop read_symbols(InflateState &now, Input &input, bool pause_at_blocks) {
 }
 
 template <class Input>
-Stop run_step(InflateState &now, Input &input, const TreePools &pools, bool pause_at_blocks) {
+Stop run_step(InflateState &now, Input &input, HuffmanNodePool *&pool, bool pause_at_blocks) {
     switch (now.step) {
     case Step::zlib_header: return read_zlib_header(now, input);
-    case Step::block_header: return read_block_header(now, input, pools);
+    case Step::block_header: return read_block_header(now, input, pool);
     case Step::stored: return copy_stored(now, input, pause_at_blocks);
     case Step::symbols: return read_symbols(now, input, pause_at_blocks);
     case Step::copy: copy_pending_match(now); return Stop::go_on;
@@ -150,16 +150,18 @@ Stop run_step(InflateState &now, Input &input, const TreePools &pools, bool paus
     return Stop::finished;
 }
 
+// `pool` takes the trees of dynamic blocks; allocated for the first of them, and owned by whoever owns the pointer.
+//
 // Goes on with the stream until `rows` or the stream itself says stop; with `pause_at_blocks` also at the end of every
 // block but the last. Called again after rows_done or block_ended it continues at the same bit.
 template <class Input, class Rows>
-Stop inflate(InflateState &state, Input &input, Rows &rows, const TreePools &pools, bool pause_at_blocks) {
+Stop inflate(InflateState &state, Input &input, Rows &rows, HuffmanNodePool *&pool, bool pause_at_blocks) {
     for (;;) {
         const bool must_deliver = state.held != Stop::go_on || room(state.window) == 0;
         const Stop rows_say = must_deliver ? deliver(state.window, rows) : Stop::go_on;
         if (rows_say != Stop::go_on) return rows_say;
         if (state.held != Stop::go_on) break;
-        state.held = run_step(state, input, pools, pause_at_blocks);
+        state.held = run_step(state, input, pool, pause_at_blocks);
     }
     const Stop held = state.held;
     if (held == Stop::block_ended) state.held = Stop::go_on; // everything else stays as it is

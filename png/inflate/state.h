@@ -31,33 +31,24 @@ struct InflateState {
     BitReader bits;
     Step step;
     bool final_block;
-    bool lookup_is_fixed; // the lookup tables hold the fixed trees
     Stop held;            // outcome that waits until the bytes before it have been delivered; go_on: none
     uint32_t stored_left; // step stored: bytes of the block still to come
     uint32_t copy_length; // step copy: of the match, still to come
     uint32_t copy_distance;
-    uint32_t literal_root; // step symbols, copy: of the block's trees, in `nodes`
-    uint32_t distance_root;
-    uint32_t fixed_roots[2];   // literal/length, distance
-    const HuffmanNode *nodes;  // of the pool that holds the block's trees
+    const LookupTables *codes; // step symbols, copy: of the block
+    const HuffmanNode *nodes;  // what the codes' longer ones go on in
     LookupTables *lookup;      // owned; NULL until the first compressed block
     uint8_t code_lengths[320]; // 288 literal/length, 32 distance
-};
-
-// Memory that the core takes when it meets the first block that needs it. Owned by whoever owns these pointers.
-struct TreePools {
-    HuffmanNodePool **fixed;
-    HuffmanNodePool **dynamic;
 };
 
 // Puts the state to the start of a stream. Keeps what it owns; the window's contents are cleared.
 void restart(InflateState &state);
 
-// Builds the fixed trees, once: `fixed` stays NULL when there is no memory for them.
-bool build_fixed_trees(InflateState &state, HuffmanNodePool *&fixed);
+void reset_pool(HuffmanNodePool &pool);
 
-// Takes the fixed trees, or those of the code lengths, for the block that begins. `literal_count` lengths stand first.
-Stop use_fixed_trees(InflateState &state, const HuffmanNodePool &fixed);
+// Take the codes of fixed blocks, or those of the code lengths, for the block that begins. `literal_count` lengths
+// stand first.
+Stop use_fixed_codes(InflateState &state);
 Stop use_dynamic_trees(InflateState &state, HuffmanNodePool &pool, uint32_t literal_count, uint32_t distance_count);
 
 } // namespace pelm
