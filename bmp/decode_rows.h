@@ -39,7 +39,7 @@ int32_t copy_rows(const BmpState &state, Band band, RowReader &reader, OutputRow
     for (int32_t i = 0; i < band.count; ++i) {
         load.row = read_row(reader, first + i);
         if (load.row == nullptr) return reader.result;
-        write_row_clipped(state.output, to.position, to.pixel_step, state.outputFormat, load, state.width);
+        write_row_clipped(state.output, to.position, to.pixel_step, state.outputFormat, load, 0, state.width);
         advance(to);
     }
     return PELM_RESULT_DONE;
@@ -77,7 +77,7 @@ int32_t reduce_rows(const BmpState &state, Band band, RowReader &reader, OutputR
             add_sample_line(load, sums, state.width, state.scaledWidth);
         }
         write_row_clipped(state.output, to.position, to.pixel_step, state.outputFormat,
-                          SumsRow<typename Load::Sum>{sums}, state.scaledWidth);
+                          SumsRow<typename Load::Sum>{sums}, 0, state.scaledWidth);
         ZOTARPELM_OsMemset(sums, 0, sums_bytes);
         advance(to);
     }

@@ -7,6 +7,7 @@
 #include <cstddef>
 
 #include "frame/bytes.h"
+#include "frame/packed.h"
 #include "frame/pixel.h"
 
 namespace pelm {
@@ -64,14 +65,8 @@ struct IndexedRow {
     const uint8_t *row;
     const uint8_t *palette; // blue, green, red, reserved; 256 entries
 
-    uint32_t index(int32_t x) const {
-        constexpr int32_t pixels_per_byte = 8 / depth;
-        if constexpr (depth == 8) return row[x];
-        const int32_t shift = 8 - depth * (x % pixels_per_byte + 1); // the leftmost pixel lies in the high bits
-        return static_cast<uint32_t>(row[x / pixels_per_byte] >> shift) & ((1u << depth) - 1);
-    }
     Rgb operator()(int32_t x) const {
-        const uint8_t *const entry = palette + 4 * index(x);
+        const uint8_t *const entry = palette + 4 * packed_sample<depth>(row, x);
         return {entry[2], entry[1], entry[0]};
     }
     uint32_t sample(int32_t x) const { return Sum::of((*this)(x)); }

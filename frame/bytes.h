@@ -20,6 +20,17 @@ inline int32_t read_i32le(const uint8_t *at) {
     return static_cast<int32_t>(read_u32le(at));
 }
 
+inline uint16_t read_u16be(const uint8_t *at) {
+    return static_cast<uint16_t>(at[0] << 8 | at[1]);
+}
+
+// A pixel in native byte order.
+inline uint16_t load_u16(const uint8_t *at) {
+    uint16_t value;
+    std::memcpy(&value, at, sizeof value);
+    return value;
+}
+
 inline void store_u16(uint8_t *at, uint16_t value) {
     std::memcpy(at, &value, sizeof value);
 }

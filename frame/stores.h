@@ -6,11 +6,25 @@
 
 namespace pelm {
 
+// The formats without alpha ask the pixel how it goes over what is there: these are for pixels that hide it.
+template <class Pixel>
+inline void put_rgb565(uint8_t *at, Pixel pixel) {
+    store_u16(at, rgb565_of(pixel));
+}
+
+template <class Pixel>
+inline void put_rgb888(uint8_t *at, Pixel pixel) {
+    const Rgb c = channels_of(pixel);
+    at[0] = c.r;
+    at[1] = c.g;
+    at[2] = c.b;
+}
+
 struct StoreRgb565 {
     static constexpr int32_t size = 2;
     template <class Pixel>
     static void put(uint8_t *at, Pixel pixel) {
-        store_u16(at, rgb565_of(pixel));
+        put_rgb565(at, pixel);
     }
 };
 
@@ -18,10 +32,7 @@ struct StoreRgb888 {
     static constexpr int32_t size = 3;
     template <class Pixel>
     static void put(uint8_t *at, Pixel pixel) {
-        const Rgb c = channels_of(pixel);
-        at[0] = c.r;
-        at[1] = c.g;
-        at[2] = c.b;
+        put_rgb888(at, pixel);
     }
 };
 

@@ -138,6 +138,48 @@ PELM_API int32_t ZOTARPELMI_DecodeBMP(ImageDecodeInfo *info, void *output, int32
  * hangs from it. Returns 1, or 0 for a NULL `info`. */
 PELM_API int32_t PELMI_BMP_DestroyBMP(ImageDecodeInfo *info);
 
+/*
+ * PNG of every colour type and depth, without interlace so far. An alpha channel, tRNS alphas and a transparent
+ * colour blend over the buffer in formats 0 and 1 and are carried in the others. docs/formats.md lists what is refused,
+ * docs/oddities.md what may surprise.
+ *
+ * A memory source (kind 1) is MODIFIED when the file has two or more IDAT chunks: they are joined in place. Streams are
+ * read twice and must seek, also kind 4.
+ */
+
+/* A whole PNG. Rows are limited to info->imageHeight when that is not 0: leave it 0. PELM_RESULT_DONE (also for a
+ * stream of pixels that breaks off in a bad code: the rows before it are written) or PELM_RESULT_FAILED; decoderState
+ * is NULL afterwards. */
+PELM_API int32_t ZOTARPELMI_DecodePNG(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight);
+
+/* The rows of one deflate block per call: PELM_RESULT_MORE until the image is complete, then PELM_RESULT_DONE. Pass the
+ * same box and buffer each time. A first block without a complete row makes every call start over: when two calls bring
+ * no row, destroy the decode and use the one-shot call. */
+PELM_API int32_t ZOTARPELMI_DecodePNGIter(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight);
+
+/* Up to `rows` further rows (all with 0): PELM_RESULT_MORE while rows remain, then PELM_RESULT_DONE. Pixel for pixel
+ * every call gets the whole box; scaled output gets a buffer whose first row is the first row of this call. */
+PELM_API int32_t ZOTARPELMI_DecodePNGLine(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
+                                          int32_t rows);
+
+/* Give up a decode in progress and free all of it. 1, or 0 for a NULL `info`. Both do the same. */
+PELM_API int32_t ZOTARPELMI_DestroyPNGInfo(ImageDecodeInfo *info);
+PELM_API int32_t ZOTARPELMI_AbortPNGIter(ImageDecodeInfo *info);
+
+/* 1 when the PNG at the request's input has an alpha channel or a tRNS chunk, else 0. Leaves the source where it ended,
+ * and for kinds 2 and 4 a 16384-byte block allocated. */
+PELM_API uint32_t PELMI_GetAlphaTrFlag(ImageDecodeInfo *info);
+
+/* A zeroed transparency record for companion code, or NULL; and its end, with the block that it owns. */
+typedef struct PngTrInfo {
+    uint32_t reserved[9];
+    uint32_t ownsBlock;
+    void *block;
+} PngTrInfo;
+
+PELM_API PngTrInfo *PELMI_FastImgCreatePngTrInfo(void);
+PELM_API int32_t PELMI_FastImgDestroyPngTrInfo(PngTrInfo *record);
+
 /* The animated-GIF words of the request; 0 or NULL for a NULL `info`. */
 PELM_API uint32_t ZOTARPELMI_GetAGIFDelayTime(const ImageDecodeInfo *info);
 PELM_API uint32_t ZOTARPELMI_GetAGIFColorTableState(const ImageDecodeInfo *info);

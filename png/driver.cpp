@@ -1,0 +1,164 @@
+// The driver that the public calls share: sets a decode up on its first call, goes on with it on later ones.
+#include <limits>
+
+#include "frame/host.h"
+#include "frame/placement.h"
+#include "png/chunks.h"
+#include "png/entry.h"
+#include "png/image_data.h"
+#include "png/placing.h"
+
+namespace pelm {
+namespace {
+
+template <class Record>
+Record *new_record() {
+    auto *const record = static_cast<Record *>(ZOTARPELM_OsMalloc(sizeof(Record)));
+    if (record != nullptr) ZOTARPELM_OsMemset(record, 0, sizeof(Record));
+    return record;
+}
+
+template <class Block>
+void free_block(Block *&block) {
+    if (block != nullptr) ZOTARPELM_OsFree(block);
+    block = nullptr;
+}
+
+bool is_readable(const InputSource *source) {
+    if (source == nullptr) return false;
+    switch (source->kind) {
+    case PELM_SOURCE_MEMORY: return source->data != nullptr && source->size > 0;
+    case PELM_SOURCE_STREAM:
+    case PELM_SOURCE_STREAM_ALT:
+    case PELM_SOURCE_SEQUENTIAL: return true;
+    default: return false;
+    }
+}
+
+bool open_reader(PngDecodeState &state, InputSource &source) {
+    state.input = new_record<PngInputBuffer>();
+    if (state.input == nullptr) return false;
+    PngInputBuffer &reader = *state.input;
+    reader.source = &source;
+    reader.sourceSize = static_cast<uint32_t>(source.size);
+    state.readsMemory = source.kind == PELM_SOURCE_MEMORY ? 1 : 0;
+    if (state.readsMemory != 0) {
+        reader.data = source.data;
+        reader.bytesLeft = reader.sourceSize;
+        return true;
+    }
+    reader.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(PNG_READ_BUFFER_SIZE));
+    if (reader.data == nullptr) return false;
+    ZOTARPELM_Seek_IO(&source, 0, 0);
+    return true;
+}
+
+uint32_t *new_words(uint64_t count) {
+    const uint64_t bytes = count * 4;
+    if (bytes > std::numeric_limits<uint32_t>::max()) return nullptr;
+    return static_cast<uint32_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(bytes)));
+}
+
+// Not checked: without them nothing is written, and the result stays.
+void allocate_accumulators(PngDecodeState &state) {
+    state.resizeRowAccum = new_words(state.imageWidth);
+    state.resizeOutAccum = new_words(state.scaledWidth);
+    if (state.resizeOutAccum != nullptr) ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
+}
+
+// PNG_ROWS_REMAIN when there is an image to decode; otherwise the driver's result, with the state gone.
+uint32_t set_up(ImageDecodeInfo &info, int32_t boxWidth, int32_t boxHeight) {
+    if (!is_readable(info.input)) return PNG_NO_MEMORY;
+    auto *const state = new_record<PngDecodeState>();
+    if (state == nullptr) return PNG_NO_MEMORY;
+    info.decoderState = state;
+    state->rotationDegrees = static_cast<uint32_t>(rotation_of(info.flags));
+    state->iterativeMode = info.iterative;
+    const bool parsed = open_reader(*state, *info.input) && __PELMI_PngParserMain(state, state->input) == PNG_DONE &&
+                        state->imageWidth != 0 && state->imageHeight != 0;
+    if (!parsed || state->interlaceMethod != 0) {
+        PELMI_DestroyDecodePng(&info);
+        return PNG_NO_MEMORY;
+    }
+    scale_png(*state, info.flags, info.decodeStarted, boxWidth, boxHeight);
+    info.outputWidth = static_cast<int32_t>(state->scaledWidth);
+    info.outputHeight = static_cast<int32_t>(state->scaledHeight);
+    // Required: nothing to show is a success (docs/oddities.md, "Nothing left of the image").
+    if (state->scaledWidth == 0 || state->scaledHeight == 0) {
+        PELMI_DestroyDecodePng(&info);
+        return PNG_DONE;
+    }
+    allocate_accumulators(*state);
+    state->outputFormat = info.outputFormat;
+    place_png(*state, info.flags, boxWidth, boxHeight);
+    return PNG_ROWS_REMAIN;
+}
+
+// False when the source cannot be the one that the decode began with.
+bool come_back(ImageDecodeInfo &info, PngDecodeState &state) {
+    if (!is_readable(info.input)) return false;
+    if ((info.input->kind == PELM_SOURCE_MEMORY) != (state.readsMemory != 0)) return false;
+    state.iterativeMode = info.iterative;
+    state.outputCursor = 0;
+    state.input->source = info.input;
+    return true;
+}
+
+uint32_t run_loop(ImageDecodeInfo &info, PngDecodeState &state) {
+    uint32_t total = 0;
+    const int64_t area = area_position(state);
+    if (state.readsMemory != 0)
+        return _PELMI_PngInflateZStreamData(&info, &total, 0, area, &state.scaledWidth, &state.scaledHeight);
+    return _PELMI_PngInflateZStreamData_streamming(&info, state.input, &total, 0, area, &state.scaledWidth,
+                                                   &state.scaledHeight);
+}
+
+} // namespace
+} // namespace pelm
+
+uint32_t PELMI_FastImgDecodePng(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
+                                int32_t rows) {
+    if (info == nullptr) return PNG_NO_MEMORY;
+    if (info->decoderState == nullptr) {
+        const uint32_t code = pelm::set_up(*info, boxWidth, boxHeight);
+        if (code != PNG_ROWS_REMAIN) return code;
+    } else if (!pelm::come_back(*info, *static_cast<PngDecodeState *>(info->decoderState))) {
+        PELMI_DestroyDecodePng(info);
+        return PNG_NO_MEMORY;
+    }
+
+    PngDecodeState &state = *static_cast<PngDecodeState *>(info->decoderState);
+    pelm::use_output(state, output, boxWidth, boxHeight);
+    if (rows > 0) state.stopRow = state.rowsDone + static_cast<uint32_t>(rows);
+    state.firstRowOfCall = state.rowsDone;
+    state.bandBase = rows > 0 ? state.firstRowOfCall : 0;
+    const uint32_t code = pelm::run_loop(*info, state);
+    switch (code) {
+    case PNG_ROWS_REMAIN: return code;
+    case PNG_ENDED_EARLY: return PNG_DONE; // the rows before the bad code are the result
+    default: PELMI_DestroyDecodePng(info); return code;
+    }
+}
+
+uint32_t PELMI_DestroyDecodePng(ImageDecodeInfo *info) {
+    using pelm::free_block;
+    auto *state = static_cast<PngDecodeState *>(info->decoderState);
+    if (state == nullptr) return 1;
+    free_block(state->rowBuffers);
+    free_block(state->inflate.window.bytes);
+    free_block(state->zeroRow);
+    free_block(state->inflate.lookup);
+    PELMI_FreePNGHuffmanMemory(&state->fixedHuffmanPool);
+    PELMI_FreePNGHuffmanMemory(&state->dynamicHuffmanPool);
+    if (state->input != nullptr && state->readsMemory == 0) free_block(state->input->data);
+    free_block(state->input);
+    free_block(state->paletteAlpha);
+    free_block(state->palette);
+    free_block(state->resizeRowAccum);
+    free_block(state->resizeOutAccum);
+    free_block(state->interlaceFrame);
+    free_block(state->idatTable);
+    free_block(state);
+    info->decoderState = nullptr;
+    return 1;
+}

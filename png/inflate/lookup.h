@@ -1,0 +1,45 @@
+// The first bits of a code resolved at once: a table of what the tree walk finds, built from the tree, which stays the
+// truth for everything longer.
+#pragma once
+
+#include "png/inflate/huffman.h"
+
+namespace pelm {
+
+constexpr uint32_t lookup_width = 9; // bits; two tables of that width fit the allocation of 5101 bytes
+constexpr uint32_t lookup_entries = 1u << lookup_width;
+
+// `op` of entries that are no leaves.
+enum : uint8_t {
+    code_goes_on = 0xFF, // `value`: the node behind the first `lookup_width` bits
+    code_is_missing = 0xFE
+};
+
+struct Symbol {
+    uint16_t value;
+    uint8_t op;
+    uint8_t bits; // of the code; where it is missing, up to the missing branch
+};
+
+struct LookupTables {
+    Symbol literal[lookup_entries];
+    Symbol distance[lookup_entries];
+};
+
+constexpr uint32_t lookup_allocation = 5101;
+static_assert(sizeof(LookupTables) <= lookup_allocation);
+
+void fill_lookup(Symbol (&table)[lookup_entries], const HuffmanNode *nodes, uint32_t root);
+
+// Goes on from a node that `depth` bits lead to; `bits` are the following ones, lowest first.
+Symbol walk_on(const HuffmanNode *nodes, uint32_t node, uint32_t depth, size_t bits);
+
+// The symbol that `bits` begin with, lowest first. Bits that are not there count as zeros: whoever calls compares
+// `Symbol::bits` with how many there are.
+inline Symbol find_symbol(const Symbol (&table)[lookup_entries], const HuffmanNode *nodes, size_t bits) {
+    const Symbol symbol = table[bits & (lookup_entries - 1)];
+    if (symbol.op != code_goes_on) return symbol;
+    return walk_on(nodes, symbol.value, lookup_width, bits >> lookup_width);
+}
+
+} // namespace pelm

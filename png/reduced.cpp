@@ -1,0 +1,125 @@
+// Reduced (and stretched) output of all other layouts: each output pixel is made of four samples at the quarter points
+// of its footprint, weighted by their alpha.
+//
+// A word holds R, G, B, A from the high byte down. Sample k of the four adds (c + k) >> 2 per channel, so that four
+// equal samples sum to exactly themselves.
+#include <algorithm>
+
+#include "frame/host.h"
+#include "frame/sampling.h"
+#include "frame/write_row.h"
+#include "png/loads.h"
+#include "png/pixels.h"
+#include "png/placing.h"
+
+namespace pelm {
+namespace {
+
+constexpr uint32_t times_alpha(uint32_t channel, uint32_t alpha) {
+    return (channel * alpha + 127) / 255;
+}
+
+constexpr uint32_t word_of(Rgba c) {
+    if (c.a == 255)
+        return static_cast<uint32_t>(c.r) << 24 | static_cast<uint32_t>(c.g) << 16 | uint32_t{c.b} << 8 | 255;
+    return times_alpha(c.r, c.a) << 24 | times_alpha(c.g, c.a) << 16 | times_alpha(c.b, c.a) << 8 | c.a;
+}
+
+// A row of finished words, as pixels with their colour at full strength again.
+struct FinishedRow {
+    const uint32_t *words;
+
+    static uint8_t full_strength(uint32_t channel, uint32_t alpha) {
+        return static_cast<uint8_t>(std::min((channel * 255 + alpha / 2) / alpha, 255u));
+    }
+    Rgba operator()(int32_t x) const {
+        const uint32_t word = words[x];
+        const uint32_t alpha = word & 255;
+        const Rgba c = {static_cast<uint8_t>(word >> 24), static_cast<uint8_t>(word >> 16),
+                        static_cast<uint8_t>(word >> 8), static_cast<uint8_t>(alpha)};
+        if (alpha == 0 || alpha == 255) return c;
+        return {full_strength(c.r, alpha), full_strength(c.g, alpha), full_strength(c.b, alpha), c.a};
+    }
+};
+
+void unpack_row(const PngDecodeState &state) {
+    uint32_t *const words = state.resizeRowAccum;
+    const auto width = static_cast<int32_t>(state.imageWidth);
+    visit_row(state, [&](const auto &load) {
+        for (int32_t x = 0; x < width; ++x) {
+            const auto pixel = load(x);
+            const Rgb c = channels_of(pixel);
+            words[x] = word_of({c.r, c.g, c.b, alpha_of(pixel)});
+        }
+    });
+}
+
+// (c + k) >> 2 in each of the four bytes.
+constexpr uint32_t share(uint32_t word, uint32_t k) {
+    constexpr uint32_t even_bytes = 0x00FF00FF;
+    const uint32_t each = k * 0x00010001;
+    return (((word & even_bytes) + each) >> 2 & even_bytes) | (((word >> 8 & even_bytes) + each) >> 2 & even_bytes)
+                                                                  << 8;
+}
+
+// Line 0 of an output row brings samples 0 and 1 of each column, line 1 samples 2 and 3.
+void add_sample_line(const PngDecodeState &state, uint32_t line) {
+    const auto width = static_cast<int32_t>(state.imageWidth);
+    const auto scaled = static_cast<int32_t>(state.scaledWidth);
+    SampleWalk left(state.samplePoints[2 * line].x, width, scaled);
+    SampleWalk right(state.samplePoints[2 * line + 1].x, width, scaled);
+    for (int32_t j = 0; j < scaled; ++j) {
+        state.resizeOutAccum[j] +=
+            share(state.resizeRowAccum[left.at], 2 * line) + share(state.resizeRowAccum[right.at], 2 * line + 1);
+        left.advance();
+        right.advance();
+    }
+}
+
+void write_finished_row(const PngDecodeState &state) {
+    const int64_t row = int64_t{state.rowsDone} - state.bandBase;
+    const int64_t position = first_pixel_position(state) + row * state.outputRowStep;
+    const int64_t step = int64_t{state.outputPixelStep} * pixel_step_unit(state.outputFormat);
+    write_row_clipped(state.output, position, step, state.outputFormat, FinishedRow{state.resizeOutAccum}, 0,
+                      static_cast<int32_t>(state.scaledWidth));
+    ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
+}
+
+// The source row that holds the sample line that comes next.
+uint64_t next_sampled_row(const PngDecodeState &state) {
+    const uint64_t point = state.samplePoints[2 * state.resizeState].y;
+    return (uint64_t{state.rowsDone} * state.imageHeight + point) / state.scaledHeight;
+}
+
+// How far the sample lines get with the source rows up to this one, when none of them can be seen.
+void count_sampled_rows(PngDecodeState &state, uint64_t source_row) {
+    const uint64_t limit = (source_row + 1) * state.scaledHeight; // lines below this belong to rows so far
+    const auto lines_of = [&](uint64_t point) {
+        return limit > point ? (limit - point - 1) / state.imageHeight + 1 : 0;
+    };
+    const uint64_t started = std::min<uint64_t>(lines_of(state.samplePoints[0].y), state.scaledHeight);
+    const uint64_t finished = std::min<uint64_t>(lines_of(state.samplePoints[2].y), state.scaledHeight);
+    state.rowsDone = static_cast<uint32_t>(finished);
+    state.resizeState = started > finished ? 1 : 0;
+}
+
+} // namespace
+
+void reduce_row(PngDecodeState &state) {
+    const uint32_t source_row = state.rowsWritten;
+    const bool visible = state.output.size != 0 && state.resizeRowAccum != nullptr && state.resizeOutAccum != nullptr;
+    if (!visible) return count_sampled_rows(state, source_row);
+    if (state.rowsDone >= state.scaledHeight || next_sampled_row(state) != source_row) return;
+
+    unpack_row(state);
+    do {
+        add_sample_line(state, state.resizeState);
+        if (state.resizeState != 0) {
+            write_finished_row(state);
+            ++state.rowsDone;
+        }
+        state.resizeState ^= 1;
+    } while (state.rowsDone < state.scaledHeight && next_sampled_row(state) == source_row);
+}
+
+} // namespace pelm
