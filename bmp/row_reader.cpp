@@ -61,7 +61,8 @@ bool open_rows(RowReader &reader, const BmpState &state, int32_t first) {
     reader = {};
     reader.input = state.input;
     reader.stride = row_stride(state.width, state.bitsPerPixel);
-    reader.current = first - 1;
+    const bool stands_at_row_0 = state.input->kind == PELM_SOURCE_SEQUENTIAL && state.rowsDone == 0;
+    reader.current = stands_at_row_0 ? -1 : first - 1;
     reader.first_row_offset = state.pixelDataOffset;
 
     switch (state.input->kind) {
