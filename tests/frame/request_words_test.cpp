@@ -29,14 +29,15 @@ TEST(RequestWords, the_animation_words_of_no_request_are_0) {
 }
 
 // Other code of a 32-bit system addresses the records by word number.
+#if UINTPTR_MAX == UINT32_MAX // only 32-bit systems have such
 TEST(RequestWords, fields_of_a_32_bit_system_lie_on_their_words) {
-    if (sizeof(void *) != 4) GTEST_SKIP() << "pointers are not 32 bits wide";
     EXPECT_EQ(sizeof(InputSource), 4u * 7);
     EXPECT_EQ(offsetof(InputSource, bufferSize), 4u * 6);
     EXPECT_EQ(sizeof(ImageDecodeInfo), 4u * 22);
     EXPECT_EQ(offsetof(ImageDecodeInfo, decoderState), 4u * 15);
     EXPECT_EQ(offsetof(ImageDecodeInfo, localColorTable), 4u * 21);
 }
+#endif
 
 } // namespace
 } // namespace pelm::test

@@ -28,11 +28,12 @@ TEST(HostMemory, freeing_null_does_nothing) {
     ZOTARPELM_OsFree(nullptr);
 }
 
+#if UINTPTR_MAX == UINT32_MAX // only 32-bit systems have such
 TEST(HostMemory, a_block_that_would_wrap_the_address_space_fails) {
-    if (sizeof(size_t) > 4) GTEST_SKIP() << "no such block";
     for (uint32_t below = 0; below < 32; ++below)
         EXPECT_EQ(ZOTARPELM_OsMalloc(UINT32_MAX - below), nullptr) << below;
 }
+#endif
 
 TEST(HostMemory, memset_fills_with_the_low_byte_of_the_value) {
     uint8_t bytes[4] = {1, 2, 3, 4};
