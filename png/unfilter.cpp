@@ -36,7 +36,7 @@ inline uint8_t paeth(int32_t a, int32_t b, int32_t c) {
     const int32_t pb = std::abs(a - c);
     const int32_t pc = std::abs(a + b - 2 * c);
     const int32_t b_or_c = pb <= pc ? b : c;
-    return static_cast<uint8_t>(pa <= pb && pa <= pc ? a : b_or_c);
+    return static_cast<uint8_t>((pa <= pb) & (pa <= pc) ? a : b_or_c);
 }
 
 template <class D>
@@ -46,6 +46,23 @@ void undo_paeth(uint8_t *__restrict row, const uint8_t *__restrict above, uint32
         row[i] = static_cast<uint8_t>(row[i] + above[i]);
     for (uint32_t i = distance; i < length; ++i)
         row[i] = static_cast<uint8_t>(row[i] + paeth(row[i - distance], above[i], above[i - distance]));
+}
+
+// Whole pixels, whose left neighbours stay in registers.
+template <uint32_t distance>
+void undo_paeth(uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length, Distance<distance>) {
+    int32_t left[distance] = {};
+    int32_t above_left[distance] = {};
+    uint32_t i = 0;
+    for (; i + distance <= length; i += distance)
+        for (uint32_t k = 0; k < distance; ++k) {
+            const int32_t up = above[i + k];
+            left[k] = static_cast<uint8_t>(row[i + k] + paeth(left[k], up, above_left[k]));
+            above_left[k] = up;
+            row[i + k] = static_cast<uint8_t>(left[k]);
+        }
+    for (uint32_t k = 0; i < length; ++i, ++k)
+        row[i] = static_cast<uint8_t>(row[i] + paeth(left[k], above[i], above_left[k]));
 }
 
 template <class D>

@@ -41,7 +41,7 @@ struct InflateState {
     uint8_t code_lengths[320]; // 288 literal/length, 32 distance
 };
 
-// Puts the state to the start of a stream. Keeps what it owns; the window's contents are cleared.
+// Puts the state to the start of a stream. Keeps what it owns.
 void restart(InflateState &state);
 
 void reset_pool(HuffmanNodePool &pool);

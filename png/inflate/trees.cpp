@@ -26,7 +26,6 @@ void reset_pool(HuffmanNodePool &pool) {
 void restart(InflateState &state) {
     uint8_t *const window = state.window.bytes;
     state.window = {window, 0, 0, 0, 0};
-    ZOTARPELM_OsMemset(window, 0, window_size);
     state.bits = {};
     state.step = Step::zlib_header;
     state.final_block = false;

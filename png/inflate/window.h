@@ -33,6 +33,12 @@ inline void wrap(Window &window) {
     if (window.write == window_size && window.delivered == window_size) window.write = window.delivered = 0;
 }
 
+// Bytes that were never produced read as zeros, without the window having been cleared. Only two matches can meet them:
+// one at distance 0, which names the very place that it writes to, and one before the first byte.
+inline uint8_t first_byte(const Window &window) {
+    return window.history == 0 ? uint8_t{0} : window.bytes[0];
+}
+
 // Copies what a match of `length` bytes at `distance` has, as far as there is room, and returns how much it was.
 // Required: a distance beyond the stream's start yields the stream's first byte until it is in reach
 // (docs/oddities.md, "Matches before the beginning").
@@ -41,7 +47,9 @@ inline uint32_t copy_match(Window &window, uint32_t length, uint32_t distance) {
     uint8_t *const out = window.bytes + window.write;
     if (window.history < distance) {
         count = std::min(count, distance - window.history);
-        std::memset(out, window.bytes[0], count);
+        std::memset(out, first_byte(window), count);
+    } else if (distance == 0) {
+        if (window.history < window_size) std::memset(out, 0, count);
     } else {
         const uint32_t from = (window.write + window_size - distance) % window_size;
         count = std::min(count, window_size - from);
