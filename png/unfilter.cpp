@@ -1,8 +1,12 @@
 #include "png/unfilter.h"
 
+#include "frame/lanes.h"
+
 #include <algorithm>
 #include <cstdlib>
 #include <type_traits>
+
+using namespace pelm;
 
 namespace {
 
@@ -36,7 +40,14 @@ inline uint8_t paeth(int32_t a, int32_t b, int32_t c) {
     const int32_t pb = std::abs(a - c);
     const int32_t pc = std::abs(a + b - 2 * c);
     const int32_t b_or_c = pb <= pc ? b : c;
-    return static_cast<uint8_t>((pa <= pb) & (pa <= pc) ? a : b_or_c);
+    return static_cast<uint8_t>(((pa <= pb) & (pa <= pc)) != 0 ? a : b_or_c);
+}
+
+inline Lanes paeth(Lanes a, Lanes b, Lanes c) {
+    const Lanes pa = magnitude(b - c);
+    const Lanes pb = magnitude(a - c);
+    const Lanes pc = magnitude(a + b - c - c);
+    return choose((pa <= pb) & (pa <= pc), a, choose(pb <= pc, b, c));
 }
 
 template <class D>
@@ -63,6 +74,30 @@ void undo_paeth(uint8_t *__restrict row, const uint8_t *__restrict above, uint32
         }
     for (uint32_t k = 0; i < length; ++i, ++k)
         row[i] = static_cast<uint8_t>(row[i] + paeth(left[k], above[i], above_left[k]));
+}
+
+// Pixels of four bytes and more, all channels of one at a time.
+template <uint32_t distance>
+requires(lanes_are_fast &&distance >= 3) void undo_average(uint8_t *row, const uint8_t *above, uint32_t length,
+                                                           Distance<distance>) {
+    Lanes left{};
+    for (uint32_t i = 0; i + distance <= length; i += distance) {
+        left = low_byte(load_lanes<distance>(row + i) + ((left + load_lanes<distance>(above + i)) >> 1));
+        store_lanes<distance>(row + i, left);
+    }
+}
+
+template <uint32_t distance>
+requires(lanes_are_fast &&distance >= 3) void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length,
+                                                         Distance<distance>) {
+    Lanes left{};
+    Lanes above_left{};
+    for (uint32_t i = 0; i + distance <= length; i += distance) {
+        const Lanes up = load_lanes<distance>(above + i);
+        left = low_byte(load_lanes<distance>(row + i) + paeth(left, up, above_left));
+        above_left = up;
+        store_lanes<distance>(row + i, left);
+    }
 }
 
 template <class D>

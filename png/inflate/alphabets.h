@@ -21,12 +21,14 @@ inline constexpr uint8_t distance_ops[base_symbols] = {16, 16, 16, 16, 17, 17, 1
 
 struct AlphabetPayloadDescriptor {
     uint32_t first_payload_symbol; // this one and those above it take base and op from the tables
+    uint32_t payload_symbols;
     const uint16_t *bases;
     const uint8_t *ops;
 };
 
-inline constexpr AlphabetPayloadDescriptor alphabets[] = {
-    {257, length_bases, length_ops}, {0, distance_bases, distance_ops}, {20, nullptr, nullptr}};
+inline constexpr AlphabetPayloadDescriptor alphabets[] = {{257, base_symbols, length_bases, length_ops},
+                                                          {0, base_symbols, distance_bases, distance_ops},
+                                                          {20, 0, nullptr, nullptr}};
 
 struct Payload {
     uint32_t value, op; // as in a leaf
@@ -36,7 +38,7 @@ constexpr Payload payload_of(HuffmanAlphabetKind kind, uint32_t symbol) {
     constexpr uint32_t end_of_block = 256;
     const AlphabetPayloadDescriptor &alphabet = alphabets[kind];
     const uint32_t payload = symbol - alphabet.first_payload_symbol;
-    if (symbol >= alphabet.first_payload_symbol && payload < base_symbols && alphabet.bases != nullptr)
+    if (symbol >= alphabet.first_payload_symbol && payload < alphabet.payload_symbols)
         return {alphabet.bases[payload], alphabet.ops[payload]};
     return {symbol, symbol == end_of_block ? HUFFMAN_END_OF_BLOCK : HUFFMAN_LITERAL};
 }

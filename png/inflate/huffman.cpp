@@ -1,6 +1,7 @@
 #include "png/inflate/huffman.h"
 
 #include <algorithm>
+#include <bit>
 
 #include "frame/host.h"
 #include "png/inflate/alphabets.h"
@@ -47,17 +48,30 @@ uint32_t new_node(HuffmanNodePool &pool) {
     return pool.nodeCount++;
 }
 
-HuffmanNode &node_of_code(HuffmanNodePool &pool, uint32_t root, uint32_t code, uint32_t length) {
-    uint32_t at = root;
-    for (uint32_t bit = length; bit-- > 0;) {
-        const uint32_t branch = (code >> bit) & 1;
-        if (pool.nodes[at].child[branch] == 0) {
-            const uint32_t fresh = new_node(pool);
-            pool.nodes[at].child[branch] = fresh;
-        }
-        at = pool.nodes[at].child[branch];
+// The nodes on the way to the code that was placed last. The next code of the same length shares all of it but its end.
+struct Path {
+    uint32_t nodes[longest_code + 1]; // [depth]
+    uint32_t code;
+};
+
+uint32_t child_of(HuffmanNodePool &pool, uint32_t node, uint32_t branch) {
+    if (pool.nodes[node].child[branch] == 0) {
+        const uint32_t fresh = new_node(pool);
+        pool.nodes[node].child[branch] = fresh;
     }
-    return pool.nodes[at];
+    return pool.nodes[node].child[branch];
+}
+
+// Goes down to `code`, whose upper `known` bits lead the way that the path went before.
+HuffmanNode &go_to_code(HuffmanNodePool &pool, Path &path, uint32_t code, uint32_t length, uint32_t known) {
+    for (uint32_t depth = known; depth < length; ++depth)
+        path.nodes[depth + 1] = child_of(pool, path.nodes[depth], code >> (length - 1 - depth) & 1);
+    path.code = code;
+    return pool.nodes[path.nodes[length]];
+}
+
+uint32_t shared_bits(uint32_t code, uint32_t other, uint32_t length) {
+    return length - static_cast<uint32_t>(std::bit_width(code ^ other));
 }
 
 void fill_leaf(HuffmanNode &leaf, uint32_t symbol, uint32_t length, HuffmanAlphabetKind kind) {
@@ -72,13 +86,18 @@ HuffmanNode *__PELMI_PngBuildHuffmanTable(const uint8_t *codeLengths, uint32_t c
     Codes codes;
     assign_codes(codeLengths, std::min(count, largest_alphabet), codes);
     const uint32_t root = new_node(*pool);
+    Path path{};
+    path.nodes[0] = root;
 
     // The longest codes first, so that a shorter one that claims the same place comes last and wins it.
     for (uint32_t length = longest_code; length > 0; --length) {
         const uint16_t *const symbols = codes.symbols + codes.begin[length];
-        for (uint32_t i = 0; i < codes.of_length[length]; ++i)
-            fill_leaf(node_of_code(*pool, root, codes.first[length] + i, length), symbols[i], length,
+        for (uint32_t i = 0; i < codes.of_length[length]; ++i) {
+            const uint32_t code = (codes.first[length] + i) & ((1u << length) - 1);
+            const uint32_t known = i == 0 ? 0 : shared_bits(code, path.code, length);
+            fill_leaf(go_to_code(*pool, path, code, length, known), symbols[i], length,
                       static_cast<HuffmanAlphabetKind>(kind));
+        }
     }
     return &pool->nodes[root];
 }
