@@ -18,9 +18,14 @@ constexpr uint8_t blend_byte(uint32_t source, uint32_t alpha, uint32_t old) {
     return static_cast<uint8_t>(((source * alpha + source) >> 8) + ((old * (256 - alpha)) >> 8));
 }
 
+// The channels of an RGB565 value, their missing low bits zeros.
+constexpr Rgb widened_rgb565(uint32_t value) {
+    return {static_cast<uint8_t>((value >> 11) << 3), static_cast<uint8_t>((value >> 5 & 63) << 2),
+            static_cast<uint8_t>((value & 31) << 3)};
+}
+
 constexpr uint16_t blend_rgb565(Rgb over, uint32_t alpha, uint32_t old) {
-    const Rgb under = {static_cast<uint8_t>((old >> 11) << 3), static_cast<uint8_t>((old >> 5 & 63) << 2),
-                       static_cast<uint8_t>((old & 31) << 3)};
+    const Rgb under = widened_rgb565(old);
     return rgb565_of(Rgb{blend_byte(over.r, alpha, under.r), blend_byte(over.g, alpha, under.g),
                          blend_byte(over.b, alpha, under.b)});
 }

@@ -76,10 +76,12 @@ uint32_t set_up(ImageDecodeInfo &info, int32_t boxWidth, int32_t boxHeight) {
     state->iterativeMode = info.iterative;
     const bool parsed = open_reader(*state, *info.input) && __PELMI_PngParserMain(state, state->input) == PNG_DONE &&
                         state->imageWidth != 0 && state->imageHeight != 0;
-    if (!parsed || state->interlaceMethod != 0) {
+    if (!parsed) {
         PELMI_DestroyDecodePng(&info);
         return PNG_NO_MEMORY;
     }
+    state->wholeWidth = state->imageWidth;
+    state->wholeHeight = state->imageHeight;
     scale_png(*state, info.flags, info.decodeStarted, boxWidth, boxHeight);
     info.outputWidth = static_cast<int32_t>(state->scaledWidth);
     info.outputHeight = static_cast<int32_t>(state->scaledHeight);
@@ -88,9 +90,14 @@ uint32_t set_up(ImageDecodeInfo &info, int32_t boxWidth, int32_t boxHeight) {
         PELMI_DestroyDecodePng(&info);
         return PNG_DONE;
     }
-    allocate_accumulators(*state);
+    const bool interlaced = state->interlaceMethod != 0;
+    if (!interlaced) allocate_accumulators(*state);
     state->outputFormat = info.outputFormat;
     place_png(*state, info.flags, boxWidth, boxHeight);
+    if (interlaced && (info.flags & PELM_INTERLACE_MASK) == PELM_INTERLACE_FRAME) {
+        state->interlaceFrame = new_words(uint64_t{state->scaledWidth} * state->scaledHeight); // not checked either
+        state->interlaceFrameUsed = 1;
+    }
     return PNG_ROWS_REMAIN;
 }
 
@@ -107,10 +114,15 @@ bool come_back(ImageDecodeInfo &info, PngDecodeState &state) {
 uint32_t run_loop(ImageDecodeInfo &info, PngDecodeState &state) {
     uint32_t total = 0;
     const int64_t area = area_position(state);
+    const uint32_t *const width = &state.scaledWidth;
+    const uint32_t *const height = &state.scaledHeight;
+    const bool interlaced = state.interlaceMethod != 0;
     if (state.readsMemory != 0)
-        return _PELMI_PngInflateZStreamData(&info, &total, 0, area, &state.scaledWidth, &state.scaledHeight);
-    return _PELMI_PngInflateZStreamData_streamming(&info, state.input, &total, 0, area, &state.scaledWidth,
-                                                   &state.scaledHeight);
+        return interlaced ? _PELMI_PngInflateZStreamDataInterlaced(&info, &total, 0, area, width, height)
+                          : _PELMI_PngInflateZStreamData(&info, &total, 0, area, width, height);
+    return interlaced
+               ? _PELMI_PngInflateZStreamDataInterlaced_streamming(&info, state.input, &total, 0, area, width, height)
+               : _PELMI_PngInflateZStreamData_streamming(&info, state.input, &total, 0, area, width, height);
 }
 
 } // namespace
@@ -128,6 +140,10 @@ uint32_t PELMI_FastImgDecodePng(ImageDecodeInfo *info, void *output, int32_t box
     }
 
     PngDecodeState &state = *static_cast<PngDecodeState *>(info->decoderState);
+    if (state.interlaceMethod != 0 && rows != 0 && rows != info->imageHeight) {
+        PELMI_DestroyDecodePng(info); // passes cannot be decoded by lines
+        return PNG_BAD_LINE_REQUEST;
+    }
     pelm::use_output(state, output, boxWidth, boxHeight);
     if (rows > 0) state.stopRow = state.rowsDone + static_cast<uint32_t>(rows);
     state.firstRowOfCall = state.rowsDone;

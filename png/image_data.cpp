@@ -31,34 +31,45 @@ uint32_t place_within_block(Step step) {
 
 // Required: a pause before the first complete row is not resumed (docs/oddities.md, "Iterative PNG decodes that start
 // over").
-bool resumes(const PngDecodeState &state) {
+bool resumes(const PlainRows &rows) {
+    const PngDecodeState &state = *rows.state;
     return state.rowsDone != 0 && state.resumePoint >= resume_in_stored && state.resumePoint <= resume_at_block;
+}
+
+bool resumes(const Adam7Rows &rows) {
+    return rows.state->rowsDone != 0 && rows.state->resumePoint == resume_at_block;
 }
 
 // The pool of the fixed codes' trees is part of what hosts budget for, and the first allocation that can fail here;
 // the codes themselves are constant tables.
-bool allocate_stream_memory(PngDecodeState &state) {
+template <class Kind>
+bool allocate_stream_memory(Kind &rows) {
+    PngDecodeState &state = *rows.state;
     if (state.fixedHuffmanPool == nullptr)
         state.fixedHuffmanPool = static_cast<HuffmanNodePool *>(ZOTARPELM_OsMalloc(sizeof(HuffmanNodePool)));
-    if (state.fixedHuffmanPool == nullptr || !allocate_rows(state)) return false;
+    if (state.fixedHuffmanPool == nullptr || !allocate_rows(rows)) return false;
     if (state.inflate.window.bytes == nullptr)
         state.inflate.window.bytes = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(window_size));
     return state.inflate.window.bytes != nullptr;
 }
 
 // Puts the whole decode to the beginning of the stream, for the first time or once more.
-Stop start(PngDecodeState &state, const PngInputBuffer *stream) {
-    if (!allocate_stream_memory(state)) return Stop::no_memory;
+template <class Kind>
+Stop start(Kind &rows, const PngInputBuffer *stream) {
+    PngDecodeState &state = *rows.state;
+    if (!allocate_stream_memory(rows)) return Stop::no_memory;
     state.resumePoint = 0;
     restart(state.inflate);
-    restart_rows(state);
+    restart_rows(rows);
     if (stream != nullptr) return open_stream(state) ? Stop::go_on : Stop::input_ended_stored;
     join_idat_chunks(state);
     state.inputNext = state.idatTable[0].memoryAddress;
     return Stop::go_on;
 }
 
-Stop run(PngDecodeState &state, bool streams, PlainRows &rows) {
+template <class Kind>
+Stop run(Kind &rows, bool streams) {
+    PngDecodeState &state = *rows.state;
     const bool pause_at_blocks = state.iterativeMode != 0;
     if (streams) {
         StreamInput input = stream_input(state);
@@ -72,7 +83,8 @@ Stop run(PngDecodeState &state, bool streams, PlainRows &rows) {
     return stop;
 }
 
-void reduce_further(PngDecodeState &state, const PlainRows &rows) {
+// Interlaced images are measured by the pass that came last.
+void reduce_further(PngDecodeState &state, const Rows &rows) {
     const uint32_t image_side = std::max(state.imageWidth, state.imageHeight);
     const uint32_t output_side = std::max(rows.output_width, rows.output_height);
     if (output_side != 0 && image_side / output_side >= 4)
@@ -97,15 +109,17 @@ uint32_t conclude(ImageDecodeInfo &info, PngDecodeState &state, Stop stop) {
     return PNG_BAD_DATA;
 }
 
+template <class Kind>
 uint32_t decode(ImageDecodeInfo *info, const PngInputBuffer *stream, uint32_t *total, int64_t area, uint32_t width,
                 uint32_t height) {
     auto *const state = static_cast<PngDecodeState *>(info->decoderState);
     if (state == nullptr) return PNG_BAD_DATA;
-    PlainRows rows = {state, width, height, area};
-    Stop stop = resumes(*state) ? ask_host(*state) : start(*state, stream);
-    if (stop == Stop::go_on) stop = run(*state, stream != nullptr, rows);
+    Kind rows = {{state, width, height, area}};
+    Stop stop = resumes(rows) ? ask_host(rows) : start(rows, stream);
+    if (stop == Stop::go_on) stop = run(rows, stream != nullptr);
     if (stop == Stop::finished) {
         *total = state->inflate.window.total;
+        finish_image(rows);
         reduce_further(*state, rows);
     }
     return conclude(*info, *state, stop);
@@ -116,13 +130,24 @@ uint32_t decode(ImageDecodeInfo *info, const PngInputBuffer *stream, uint32_t *t
 
 uint32_t _PELMI_PngInflateZStreamData(ImageDecodeInfo *info, uint32_t *total, uint32_t, int64_t area,
                                       const uint32_t *outputWidth, const uint32_t *outputHeight) {
-    return pelm::decode(info, nullptr, total, area, *outputWidth, *outputHeight);
+    return pelm::decode<pelm::PlainRows>(info, nullptr, total, area, *outputWidth, *outputHeight);
 }
 
 uint32_t _PELMI_PngInflateZStreamData_streamming(ImageDecodeInfo *info, PngInputBuffer *input, uint32_t *total,
                                                  uint32_t, int64_t area, const uint32_t *outputWidth,
                                                  const uint32_t *outputHeight) {
-    return pelm::decode(info, input, total, area, *outputWidth, *outputHeight);
+    return pelm::decode<pelm::PlainRows>(info, input, total, area, *outputWidth, *outputHeight);
+}
+
+uint32_t _PELMI_PngInflateZStreamDataInterlaced(ImageDecodeInfo *info, uint32_t *total, uint32_t, int64_t area,
+                                                const uint32_t *outputWidth, const uint32_t *outputHeight) {
+    return pelm::decode<pelm::Adam7Rows>(info, nullptr, total, area, *outputWidth, *outputHeight);
+}
+
+uint32_t _PELMI_PngInflateZStreamDataInterlaced_streamming(ImageDecodeInfo *info, PngInputBuffer *input,
+                                                           uint32_t *total, uint32_t, int64_t area,
+                                                           const uint32_t *outputWidth, const uint32_t *outputHeight) {
+    return pelm::decode<pelm::Adam7Rows>(info, input, total, area, *outputWidth, *outputHeight);
 }
 
 uint32_t __PELMI_NearestInterpolateOutput(PngDecodeState *, int64_t, uint32_t, uint32_t) {

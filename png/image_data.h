@@ -1,5 +1,5 @@
-// The image-data loops: from the compressed stream to written rows. Memory or stream, rows one after the other (Adam7:
-// another file); one core (png/inflate/inflate.h) does the work.
+// The image-data loops: from the compressed stream to written rows. Memory or stream, rows one after the other or in
+// Adam7 passes; one core (png/inflate/inflate.h) does the work.
 //
 // `total` receives the number of bytes inflated when the image is complete. `area` is the byte offset of the placed
 // image's first pixel in the buffer of the current call. Results are internal codes: after PNG_DONE, PNG_ENDED_EARLY
@@ -14,6 +14,14 @@ PELM_EXPORT uint32_t _PELMI_PngInflateZStreamData(ImageDecodeInfo *info, uint32_
 PELM_EXPORT uint32_t _PELMI_PngInflateZStreamData_streamming(ImageDecodeInfo *info, PngInputBuffer *input,
                                                              uint32_t *total, uint32_t unused, int64_t area,
                                                              const uint32_t *outputWidth, const uint32_t *outputHeight);
+
+PELM_EXPORT uint32_t _PELMI_PngInflateZStreamDataInterlaced(ImageDecodeInfo *info, uint32_t *total, uint32_t unused,
+                                                            int64_t area, const uint32_t *outputWidth,
+                                                            const uint32_t *outputHeight);
+PELM_EXPORT uint32_t _PELMI_PngInflateZStreamDataInterlaced_streamming(ImageDecodeInfo *info, PngInputBuffer *input,
+                                                                       uint32_t *total, uint32_t unused, int64_t area,
+                                                                       const uint32_t *outputWidth,
+                                                                       const uint32_t *outputHeight);
 
 // A hook for a further reduction of strongly reduced images, which this decoder does without: returns 0.
 PELM_EXPORT uint32_t __PELMI_NearestInterpolateOutput(PngDecodeState *state, int64_t area, uint32_t outputWidth,

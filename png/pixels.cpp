@@ -33,10 +33,13 @@ bool is_grey_8(const PngDecodeState &state) {
 } // namespace
 } // namespace pelm
 
-void __PELMI_PngWriteDataToOutputBuffer(PngDecodeState *state, uint32_t, uint32_t imageWidth, uint32_t imageHeight,
+void __PELMI_PngWriteDataToOutputBuffer(PngDecodeState *state, uint32_t row, uint32_t imageWidth, uint32_t imageHeight,
                                         uint32_t outputWidth, uint32_t outputHeight, int64_t area) {
     const bool belongs_to_image = state->rowsWritten < state->imageHeight; // data may bring more rows than that
-    if (state->isOneToOne != 0) {
+    if (state->interlaceMethod != 0) {
+        pelm::write_pass_row(*state, row, area);
+        ++state->rowsDone;
+    } else if (state->isOneToOne != 0) {
         if (belongs_to_image) pelm::write_row_as_it_is(*state, area);
         ++state->rowsDone;
     } else if (pelm::is_grey_8(*state)) {

@@ -19,4 +19,7 @@ void write_scaled_grey_row(PngDecodeState &state, uint32_t x_step, uint32_t y_st
                            uint32_t scaled_height, int64_t area);
 void reduce_row(PngDecodeState &state);
 
+// The current row as row `row` of the pass that interlaceMethod holds.
+void write_pass_row(PngDecodeState &state, uint32_t row, int64_t area);
+
 } // namespace pelm

@@ -11,55 +11,18 @@
 #include "png/loads.h"
 #include "png/pixels.h"
 #include "png/placing.h"
+#include "png/weighted.h"
 
 namespace pelm {
 namespace {
-
-constexpr uint32_t times_alpha(uint32_t channel, uint32_t alpha) {
-    return (channel * alpha + 127) / 255;
-}
-
-constexpr uint32_t word_of(Rgba c) {
-    if (c.a == 255)
-        return static_cast<uint32_t>(c.r) << 24 | static_cast<uint32_t>(c.g) << 16 | uint32_t{c.b} << 8 | 255;
-    return times_alpha(c.r, c.a) << 24 | times_alpha(c.g, c.a) << 16 | times_alpha(c.b, c.a) << 8 | c.a;
-}
-
-// A row of finished words, as pixels with their colour at full strength again.
-struct FinishedRow {
-    const uint32_t *words;
-
-    static uint8_t full_strength(uint32_t channel, uint32_t alpha) {
-        return static_cast<uint8_t>(std::min((channel * 255 + alpha / 2) / alpha, 255u));
-    }
-    Rgba operator()(int32_t x) const {
-        const uint32_t word = words[x];
-        const uint32_t alpha = word & 255;
-        const Rgba c = {static_cast<uint8_t>(word >> 24), static_cast<uint8_t>(word >> 16),
-                        static_cast<uint8_t>(word >> 8), static_cast<uint8_t>(alpha)};
-        if (alpha == 0 || alpha == 255) return c;
-        return {full_strength(c.r, alpha), full_strength(c.g, alpha), full_strength(c.b, alpha), c.a};
-    }
-};
 
 void unpack_row(const PngDecodeState &state) {
     uint32_t *const words = state.resizeRowAccum;
     const auto width = static_cast<int32_t>(state.imageWidth);
     visit_row(state, [&](const auto &load) {
-        for (int32_t x = 0; x < width; ++x) {
-            const auto pixel = load(x);
-            const Rgb c = channels_of(pixel);
-            words[x] = word_of({c.r, c.g, c.b, alpha_of(pixel)});
-        }
+        for (int32_t x = 0; x < width; ++x)
+            words[x] = weighted_word(load(x));
     });
-}
-
-// (c + k) >> 2 in each of the four bytes.
-constexpr uint32_t share(uint32_t word, uint32_t k) {
-    constexpr uint32_t even_bytes = 0x00FF00FF;
-    const uint32_t each = k * 0x00010001;
-    return (((word & even_bytes) + each) >> 2 & even_bytes) | (((word >> 8 & even_bytes) + each) >> 2 & even_bytes)
-                                                                  << 8;
 }
 
 // Line 0 of an output row brings samples 0 and 1 of each column, line 1 samples 2 and 3.
@@ -80,7 +43,7 @@ void write_finished_row(const PngDecodeState &state) {
     const int64_t row = int64_t{state.rowsDone} - state.bandBase;
     const int64_t position = first_pixel_position(state) + row * state.outputRowStep;
     const int64_t step = int64_t{state.outputPixelStep} * pixel_step_unit(state.outputFormat);
-    write_row_clipped(state.output, position, step, state.outputFormat, FinishedRow{state.resizeOutAccum}, 0,
+    write_row_clipped(state.output, position, step, state.outputFormat, WeightedRow{state.resizeOutAccum}, 0,
                       static_cast<int32_t>(state.scaledWidth));
     ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
 }

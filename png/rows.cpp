@@ -1,16 +1,50 @@
 #include "png/rows.h"
 
-#include <algorithm>
-#include <cstring>
 #include <limits>
 #include <utility>
 
 #include "frame/host.h"
+#include "png/adam7.h"
+#include "png/frame_buffer.h"
 #include "png/pixels.h"
+#include "png/placing.h"
 #include "png/unfilter.h"
 
 namespace pelm {
 namespace {
+
+// The row buffers fit a row of the whole image.
+bool allocate_row_buffers(PngDecodeState &state) {
+    const uint64_t row = (uint64_t{state.wholeWidth} * state.bitsPerPixel + 7) / 8 + 1;
+    const uint64_t bytes = 2 * (row + state.wholeWidth);
+    if (bytes > std::numeric_limits<uint32_t>::max()) return false;
+    state.rowLength = static_cast<uint32_t>(row);
+    if (state.rowBuffers == nullptr)
+        state.rowBuffers = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(bytes)));
+    return state.rowBuffers != nullptr;
+}
+
+void restart_state(PngDecodeState &state) {
+    state.imageWidth = state.wholeWidth;
+    state.imageHeight = state.wholeHeight;
+    state.rowNow = state.rowBuffers;
+    state.rowBefore = state.rowBuffers + state.rowLength;
+    state.rowFilled = 0;
+    for (uint32_t i = 0; i < 4; ++i) {
+        const auto across = uint64_t{state.wholeWidth} * (i % 2 == 0 ? 1 : 3) >> 2;
+        const auto down = uint64_t{state.wholeHeight} * (i < 2 ? 1 : 3) >> 2;
+        state.samplePoints[i] = {static_cast<uint32_t>(across), static_cast<uint32_t>(down)};
+    }
+    state.sourceX = state.sourceY = state.rowsWritten = state.rowFlag = 0;
+    state.rowsDone = 0;
+    state.resizeState = 0;
+}
+
+void write_current_row(const Rows &rows, uint32_t row) {
+    const PngDecodeState &state = *rows.state;
+    __PELMI_PngWriteDataToOutputBuffer(rows.state, row, state.wholeWidth, state.wholeHeight, rows.output_width,
+                                       rows.output_height, rows.area);
+}
 
 // In line mode a call ends when the rows done reach its last one. Where one source row can finish several output rows
 // they may also pass it; a last row that an earlier call has reached ends nothing.
@@ -21,69 +55,87 @@ bool stops_here(const PngDecodeState &state, uint32_t rows_before) {
     return rows_before < state.stopRow && state.rowsDone >= state.stopRow;
 }
 
-Stop finish_row(PlainRows &rows) {
-    PngDecodeState &state = *rows.state;
-    state.rowFilled = 0;
-    state.currentRow = state.rowNow + 1;
-    __PELMI_PngReadFilterRow(&state, state.rowNow + 1, state.rowBefore + 1, state.rowLength - 1);
-    std::swap(state.rowNow, state.rowBefore);
-
-    const uint32_t rows_before = state.rowsDone;
-    __PELMI_PngWriteDataToOutputBuffer(&state, 0, state.imageWidth, state.imageHeight, rows.output_width,
-                                       rows.output_height, rows.area);
-    return stops_here(state, rows_before) ? Stop::rows_done : ask_host(state);
+// To pass `pass`, or the next one that has pixels. Behind the last one there is only surplus data.
+void enter_pass(PngDecodeState &state, uint32_t pass) {
+    pass = std::min(pass, pass_count + 1);
+    state.rowLength = getPassRowBytes(&state, state.wholeWidth, state.wholeHeight, &pass) + 1;
+    state.passRow = 0;
 }
 
 } // namespace
 
-bool allocate_rows(PngDecodeState &state) {
-    const uint64_t row = (uint64_t{state.imageWidth} * state.bitsPerPixel + 7) / 8 + 1;
-    const uint64_t bytes = 2 * (row + state.imageWidth);
-    if (bytes > std::numeric_limits<uint32_t>::max()) return false;
-    state.rowLength = static_cast<uint32_t>(row);
-    if (state.rowBuffers == nullptr)
-        state.rowBuffers = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(bytes)));
-    return state.rowBuffers != nullptr;
+bool allocate_rows(PlainRows &rows) {
+    return allocate_row_buffers(*rows.state);
 }
 
-void restart_rows(PngDecodeState &state) {
-    state.rowNow = state.rowBuffers;
-    state.rowBefore = state.rowBuffers + state.rowLength;
-    state.rowFilled = 0;
-    ZOTARPELM_OsMemset(state.rowBefore, 0, state.rowLength);
+bool allocate_rows(Adam7Rows &rows) {
+    PngDecodeState &state = *rows.state;
+    const uint64_t zeros = uint64_t{state.wholeWidth} * 8; // a pixel has no more bytes than that
+    if (!allocate_row_buffers(state) || zeros > std::numeric_limits<uint32_t>::max()) return false;
+    if (state.zeroRow != nullptr) return true;
+    state.zeroRow = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(zeros)));
+    if (state.zeroRow != nullptr) ZOTARPELM_OsMemset(state.zeroRow, 0, static_cast<uint32_t>(zeros));
+    return state.zeroRow != nullptr;
+}
 
-    for (uint32_t i = 0; i < 4; ++i) {
-        const auto across = uint64_t{state.imageWidth} * (i % 2 == 0 ? 1 : 3) >> 2;
-        const auto down = uint64_t{state.imageHeight} * (i < 2 ? 1 : 3) >> 2;
-        state.samplePoints[i] = {static_cast<uint32_t>(across), static_cast<uint32_t>(down)};
-    }
-    state.sourceX = state.sourceY = state.rowsWritten = state.rowFlag = 0;
-    state.rowsDone = 0;
-    state.resizeState = 0;
+void restart_rows(PlainRows &rows) {
+    PngDecodeState &state = *rows.state;
+    restart_state(state);
+    ZOTARPELM_OsMemset(state.rowBefore, 0, state.rowLength);
     if (state.resizeOutAccum != nullptr) ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
 }
 
-Stop take_run(PlainRows &rows, const uint8_t *bytes, uint32_t count, uint32_t &taken) {
-    PngDecodeState &state = *rows.state;
-    for (taken = 0; taken < count;) {
-        const uint32_t run = std::min(count - taken, state.rowLength - state.rowFilled);
-        std::memcpy(state.rowNow + state.rowFilled, bytes + taken, run);
-        state.rowFilled += run;
-        taken += run;
-        if (state.rowFilled < state.rowLength) break;
-        const Stop stop = finish_row(rows);
-        if (stop != Stop::go_on) return stop;
-    }
-    return Stop::go_on;
+void restart_rows(Adam7Rows &rows) {
+    restart_state(*rows.state);
+    clear_frame(*rows.state);
+    enter_pass(*rows.state, 1);
 }
 
-Stop ask_host(const PngDecodeState &state) {
-    if (state.skipStatusCheck != 0) return Stop::go_on;
+Stop finish_row(PlainRows &rows) {
+    PngDecodeState &state = *rows.state;
+    __PELMI_PngReadFilterRow(&state, state.rowNow + 1, state.rowBefore + 1, state.rowLength - 1);
+    std::swap(state.rowNow, state.rowBefore);
+    const uint32_t rows_before = state.rowsDone;
+    write_current_row(rows, 0);
+    return stops_here(state, rows_before) ? Stop::rows_done : ask_host(rows);
+}
+
+Stop finish_row(Adam7Rows &rows) {
+    PngDecodeState &state = *rows.state;
+    const uint8_t *const above = state.passRow == 0 ? state.zeroRow : state.rowBefore + 1;
+    __PELMI_PngReadFilterRow(&state, state.rowNow + 1, above, state.rowLength - 1);
+    std::swap(state.rowNow, state.rowBefore);
+    write_current_row(rows, state.passRow);
+    const Stop stop = ask_host(rows);
+    if (++state.passRow == state.imageHeight) enter_pass(state, state.interlaceMethod + 1u);
+    return stop;
+}
+
+void finish_image(PlainRows &) {}
+
+void finish_image(Adam7Rows &rows) {
+    PngDecodeState &state = *rows.state;
+    if (state.isOneToOne != 0 || state.interlaceFrameUsed == 0) return;
+    state.outputCursor = static_cast<intptr_t>(first_pixel_position(state));
+    divide_frame_by_alpha(state);
+    __PELMI_WriteOutputDataFromINTBuffer(&state);
+}
+
+Stop ask_host() {
     int32_t status = 0;
     ZOTARPELM_CheckExStatus(&status);
     if (status < 0) return Stop::host_stopped;
     if (status > 0) ZOTARPELM_OsSleep(status);
     return Stop::go_on;
+}
+
+Stop ask_host(const PlainRows &rows) {
+    return rows.state->skipStatusCheck != 0 ? Stop::go_on : ask_host();
+}
+
+// Required: interlaced images ask whatever skipStatusCheck says.
+Stop ask_host(const Adam7Rows &) {
+    return ask_host();
 }
 
 } // namespace pelm

@@ -1,26 +1,63 @@
 // What happens between inflated bytes and pixels: rows are cut, unfiltered, written, and the host is asked after each.
+// The two kinds of rows differ in what a finished row means.
 #pragma once
+
+#include <algorithm>
+#include <cstring>
 
 #include "png/state.h"
 
 namespace pelm {
 
-// Rows of a picture that is not interlaced, as the core's consumer of bytes.
-struct PlainRows {
+// Rows as the core's consumer of bytes (png/inflate/inflate.h).
+struct Rows {
     PngDecodeState *state;
     uint32_t output_width, output_height;
     int64_t area;
 };
 
-// Allocates the row buffers, once. False without memory.
-bool allocate_rows(PngDecodeState &state);
+// One after the other.
+struct PlainRows : Rows {};
 
-// Puts rows, writer and sampling to the image's beginning.
-void restart_rows(PngDecodeState &state);
+// Pass by pass.
+struct Adam7Rows : Rows {};
 
-Stop take_run(PlainRows &rows, const uint8_t *bytes, uint32_t count, uint32_t &taken);
+// Allocate what the rows need, once. False without memory.
+bool allocate_rows(PlainRows &rows);
+bool allocate_rows(Adam7Rows &rows);
+
+// Put rows, writer and sampling to the image's beginning.
+void restart_rows(PlainRows &rows);
+void restart_rows(Adam7Rows &rows);
+
+// The current row is complete. go_on, rows_done or host_stopped.
+Stop finish_row(PlainRows &rows);
+Stop finish_row(Adam7Rows &rows);
+
+// The image is complete.
+void finish_image(PlainRows &rows);
+void finish_image(Adam7Rows &rows);
 
 // go_on, or host_stopped.
-Stop ask_host(const PngDecodeState &state);
+Stop ask_host();
+Stop ask_host(const PlainRows &rows);
+Stop ask_host(const Adam7Rows &rows);
+
+template <class Kind>
+Stop take_run(Kind &rows, const uint8_t *bytes, uint32_t count, uint32_t &taken) {
+    PngDecodeState &state = *rows.state;
+    for (taken = 0; taken < count;) {
+        const uint32_t run = std::min(count - taken, state.rowLength - state.rowFilled);
+        std::memcpy(state.rowNow + state.rowFilled, bytes + taken, run);
+        state.rowFilled += run;
+        taken += run;
+        if (state.rowFilled < state.rowLength) break;
+        state.rowFilled = 0;
+        state.currentRow = state.rowNow + 1;
+        const Stop stop = finish_row(rows);
+        if (stop != Stop::go_on) return stop;
+    }
+    return Stop::go_on;
+}
 
 } // namespace pelm

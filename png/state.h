@@ -58,7 +58,7 @@ struct PngSamplePoint {
 };
 
 // Fills the record up to the size that hosts of 32-bit systems account for.
-constexpr size_t png_state_fill = 81;
+constexpr size_t png_state_fill = 78;
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed.
 struct PngDecodeState {
@@ -97,13 +97,16 @@ struct PngDecodeState {
     pelm::InflateState inflate;
     uint8_t *rowNow; // the one being filled, filter byte first
     uint8_t *rowBefore;
-    uint32_t rowFilled;             // bytes of it so far
-    uint32_t rowLength;             // filter byte included
-    uint32_t idatIndexed;           // entries of idatTable; idatCount counts down as streams use them up
-    uint32_t idatIndex;             // the entry being read
-    uint32_t resumePoint;           // 1 to 4: rows done; 5: block ended; 0: the stream starts over
-    const uint8_t *inputNext;       // memory: the next compressed byte
-    uint32_t skipStatusCheck;       // the host is not polled
+    uint32_t rowFilled;       // bytes of it so far
+    uint32_t rowLength;       // filter byte included
+    uint32_t idatIndexed;     // entries of idatTable; idatCount counts down as streams use them up
+    uint32_t idatIndex;       // the entry being read
+    uint32_t resumePoint;     // 1 to 4: rows done; 5: block ended; 0: the stream starts over
+    const uint8_t *inputNext; // memory: the next compressed byte
+    uint32_t skipStatusCheck; // the host is not polled
+    uint32_t wholeWidth;      // of the image, whatever pass imageWidth and imageHeight stand for
+    uint32_t wholeHeight;
+    uint32_t passRow;               // Adam7: index of the row being filled
     uint16_t transparentSamples[3]; // tRNS at full width
     uint8_t readsMemory;            // the decode began with a memory source
     uint8_t idatJoined;

@@ -1,0 +1,17 @@
+// The whole-frame buffer of interlaced images: a word per output pixel, R, G, B, A from the high byte down, and the way
+// from there to the caller's buffer.
+#pragma once
+
+#include "png/state.h"
+
+// Writes the frame through outputCursor and the steps, and leaves the cursor behind the last row. Formats 0 and 1 blend
+// when the image has a tRNS chunk, and only then, with the weights alpha and 255 - alpha.
+PELM_EXPORT void __PELMI_WriteOutputDataFromINTBuffer(PngDecodeState *state);
+
+namespace pelm {
+
+// Scaled images only; does nothing without a frame.
+void clear_frame(const PngDecodeState &state);
+void divide_frame_by_alpha(const PngDecodeState &state);
+
+} // namespace pelm
