@@ -84,10 +84,12 @@ int32_t reduce_rows(const BmpState &state, Band band, RowReader &reader, OutputR
     return PELM_RESULT_DONE;
 }
 
-// Decodes `rows` output rows from `state.rowsDone` on. `load` is the layout; its row is filled in here.
+// Decodes `rows` output rows from `state.rowsDone` on. `load` is the layout; its row is filled in here. Nothing is
+// decoded of a record whose rows are laid out otherwise.
 template <class Load>
 int32_t decode_rows(const BmpState &state, intptr_t cursor, int32_t rows, const Load &load) {
     const Band band = {state.rowsDone, std::min(rows, state.scaledHeight - state.rowsDone)};
+    if (state.bitsPerPixel != Load::bits) return PELM_RESULT_DONE;
     if (band.count <= 0 || state.scaledWidth <= 0 || state.height == 0) return PELM_RESULT_DONE;
 
     RowReader reader;

@@ -1,4 +1,6 @@
 // From a request to a record that is ready to decode: header, colours, size and place in the output, buffers.
+#include <algorithm>
+#include <cstdlib>
 #include <limits>
 
 #include "bmp/colours.h"
@@ -11,20 +13,19 @@
 namespace pelm {
 namespace {
 
-// The steps from pixel to pixel, in the record's units. False when they do not fit it.
+// In 64 bits even the walk over all rows stays in range from there.
+constexpr int64_t farthest_position = std::min<int64_t>(std::numeric_limits<intptr_t>::max(), int64_t{1} << 62);
+
+// The first pixel and the steps from there, in the record's units. False when they do not fit it.
 bool place_in_output(BmpState &state, Size buffer, Size scaled) {
     const int32_t pixel_bytes = bytes_per_pixel(state.outputFormat);
     const Placement placement = place(state.rotation, buffer, scaled);
-
-    // Far below the range of 64 bits, so that a walk over all rows from there cannot leave it either.
-    constexpr int64_t farthest = std::numeric_limits<intptr_t>::max() / 2;
-    const int64_t first_limit = farthest / pixel_bytes;
-    if (placement.first > first_limit || placement.first < -first_limit) return false;
-    state.outputCursor = static_cast<intptr_t>(placement.first * pixel_bytes);
-
+    const int64_t farthest_pixel = farthest_position / pixel_bytes;
     const int64_t row_step = placement.row_step * pixel_bytes * (state.topDown != 0 ? -1 : 1);
     const int64_t pixel_step = placement.pixel_step * pixel_bytes / pixel_step_unit(state.outputFormat);
-    if (!fits_int32(row_step) || !fits_int32(pixel_step)) return false;
+    if (std::abs(placement.first) > farthest_pixel || !fits_int32(row_step) || !fits_int32(pixel_step)) return false;
+
+    state.outputCursor = static_cast<intptr_t>(placement.first * pixel_bytes);
     state.rowStep = static_cast<int32_t>(row_step);
     state.pixelStep = static_cast<int32_t>(pixel_step);
     return true;

@@ -1,7 +1,7 @@
 // One pixel out of a stored row, for each of the layouts that a BMP has, and what scaled output makes of it.
 //
-// Each load also names its `Sum`: the accumulator word that four samples of the layout are added into, which is itself
-// a pixel once it is complete.
+// Each load also names its `bits` per pixel and its `Sum`: the accumulator word that four samples of the layout are
+// added into, which is itself a pixel once it is complete.
 #pragma once
 
 #include <cstddef>
@@ -62,6 +62,7 @@ struct SumsRow {
 template <int32_t depth>
 struct IndexedRow {
     using Sum = TenBitSums;
+    static constexpr uint32_t bits = depth;
     const uint8_t *row;
     const uint8_t *palette; // blue, green, red, reserved; 256 entries
 
@@ -88,6 +89,7 @@ constexpr Rgb channels_of(Fields565 pixel) {
 
 struct MaskedRow {
     using Sum = TenBitSums;
+    static constexpr uint32_t bits = 16;
     const uint8_t *row;
     uint32_t red_mask, green_mask, blue_mask;
     uint32_t red_shift, green_shift, blue_shift; // below 32
@@ -102,6 +104,7 @@ struct MaskedRow {
 
 struct Bgr24Row {
     using Sum = TenBitSums;
+    static constexpr uint32_t bits = 24;
     const uint8_t *row;
 
     Rgb operator()(int32_t x) const {
@@ -113,6 +116,7 @@ struct Bgr24Row {
 
 struct Bgrx32Row {
     using Sum = QuarterSums;
+    static constexpr uint32_t bits = 32;
     const uint8_t *row;
 
     Rgb operator()(int32_t x) const {

@@ -55,37 +55,44 @@ const uint8_t *row_in_stream(RowReader &reader, int32_t index) {
     return reader.row;
 }
 
+// Pixel for pixel a row counts only with its padding; scaled it may lack that, but not begin in the last two bytes of
+// the file.
+void set_limits(RowReader &reader, const BmpState &state) {
+    const bool padded = state.oneToOne != 0;
+    reader.bytes_needed = padded ? reader.stride : row_bytes(state.width, state.bitsPerPixel);
+    reader.bytes_behind = padded ? 0 : 2;
+}
+
+void open_seekable(RowReader &reader, int32_t first) {
+    // A place that the position's 32 bits cannot name lies behind the end of any stream.
+    constexpr int64_t farthest = std::numeric_limits<int32_t>::max();
+    const int64_t offset = std::min(offset_of(reader, first), farthest);
+    ZOTARPELM_Seek_IO(reader.input, static_cast<int32_t>(offset), 0);
+    reader.capacity = reader.input->bufferSize;
+    reader.buffer = reader.input->data;
+}
+
+bool open_sequential(RowReader &reader, const BmpState &state) {
+    // The first rows of a top-down image may hold no sample, but they are what the stream delivers first.
+    if (state.topDown != 0 && state.rowsDone == 0) reader.current = -1;
+    reader.capacity = std::max(reader.input->bufferSize, reader.stride);
+    reader.buffer = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(reader.capacity)));
+    reader.owns_buffer = true;
+    return reader.buffer != nullptr;
+}
+
 } // namespace
 
 bool open_rows(RowReader &reader, const BmpState &state, int32_t first) {
     reader = {};
     reader.input = state.input;
     reader.stride = row_stride(state.width, state.bitsPerPixel);
-    const bool stands_at_row_0 = state.input->kind == PELM_SOURCE_SEQUENTIAL && state.rowsDone == 0;
-    reader.current = stands_at_row_0 ? -1 : first - 1;
+    reader.current = first - 1;
     reader.first_row_offset = state.pixelDataOffset;
-
     switch (state.input->kind) {
-    case PELM_SOURCE_MEMORY:
-        // Pixel for pixel a row counts only with its padding; scaled it may lack that, but not begin in the last two
-        // bytes of the file.
-        reader.bytes_needed = state.oneToOne != 0 ? reader.stride : row_bytes(state.width, state.bitsPerPixel);
-        reader.bytes_behind = state.oneToOne != 0 ? 0 : 2;
-        return true;
-    case PELM_SOURCE_SEQUENTIAL:
-        reader.capacity = std::max(state.input->bufferSize, reader.stride);
-        reader.buffer = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(reader.capacity)));
-        reader.owns_buffer = true;
-        return reader.buffer != nullptr;
-    default: {
-        // A place that the position's 32 bits cannot name lies behind the end of any stream.
-        constexpr int64_t farthest = std::numeric_limits<int32_t>::max();
-        const int64_t offset = std::min(offset_of(reader, first), farthest);
-        ZOTARPELM_Seek_IO(state.input, static_cast<int32_t>(offset), 0);
-        reader.capacity = state.input->bufferSize;
-        reader.buffer = state.input->data;
-        return true;
-    }
+    case PELM_SOURCE_MEMORY: set_limits(reader, state); return true;
+    case PELM_SOURCE_SEQUENTIAL: return open_sequential(reader, state);
+    default: open_seekable(reader, first); return true;
     }
 }
 

@@ -26,8 +26,8 @@ struct RowReader {
     bool owns_buffer;
 };
 
-// Starts in front of file row `first`. Streams are positioned there; a sequential one is read from where it stands,
-// which is file row 0 before the first band. False when there is no memory for the row buffer.
+// Starts in front of file row `first`. Streams are positioned there; a sequential one is read from where it stands.
+// False when there is no memory for the row buffer.
 bool open_rows(RowReader &reader, const BmpState &state, int32_t first);
 
 // File row `index`, which is the current one or a later one. NULL once the data has ended: `result` says how.

@@ -20,11 +20,16 @@ bool scale_to_box(Size image, Size box, bool stretch, Scaling &scaling) {
     const int64_t height_for_box_width = static_cast<int64_t>(image.height) * box.width / image.width;
     const bool fills_the_box = (height_for_box_width == box.height || width_for_box_height == box.width) &&
                                box.width <= image.width && box.height <= image.height;
+    if (fills_the_box) {
+        scaling = {box, false};
+        return true;
+    }
+
     int64_t width = image.width;
     int64_t height = image.height;
-    if (fills_the_box || box.width < image.width) {
+    if (box.width < width) {
         width = box.width;
-        height = fills_the_box ? box.height : height_for_box_width;
+        height = height_for_box_width;
     }
     if (box.height < height) {
         width = width_for_box_height;

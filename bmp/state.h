@@ -1,5 +1,5 @@
-// The private record of a BMP decode, which hangs from `decoderState`, and the working functions that share it.
-// How a row of pixels is stored in the file is known to the readers, not to the record.
+// The private record of a BMP decode, which hangs from `decoderState`. How a row of pixels is stored in the file is
+// known to the readers, not to the record.
 #pragma once
 
 #include "frame/clip.h"

@@ -129,8 +129,8 @@ typedef struct ImageDecodeInfo {
 /*
  * Decodes a whole BMP. Accepted: headers of 12, 40 and 56 to 64 bytes; 1, 4, 8, 16, 24 and 32 bits per pixel;
  * uncompressed, and bit fields at 16 bits. docs/formats.md lists what is refused.
- * Returns PELM_RESULT_DONE (also for a truncated pixel array: the rows that are missing are not written) or
- * PELM_RESULT_FAILED. `decoderState` is NULL afterwards.
+ * Returns PELM_RESULT_DONE (also for a truncated pixel array: the rows that are missing are not written), and then
+ * `decoderState` is NULL; or PELM_RESULT_FAILED, and then it is as it was.
  */
 PELM_API int32_t ZOTARPELMI_DecodeBMP(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight);
 
