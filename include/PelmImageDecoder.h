@@ -36,12 +36,13 @@ enum {
     PELM_SOURCE_STREAM = 0,     /* read and seek services */
     PELM_SOURCE_MEMORY = 1,     /* `size` bytes at `data`, read in place */
     PELM_SOURCE_STREAM_ALT = 2, /* the same as 0 */
-    PELM_SOURCE_SEQUENTIAL = 4  /* read service only: never moved back while rows are decoded */
+    PELM_SOURCE_SEQUENTIAL =
+        4 /* read service only: BMP never moves it while it decodes rows. PNG needs seeks here too */
 };
 
 /*
  * Output pixel formats: ImageDecodeInfo.outputFormat. Named in the order of bytes in memory, except for the 16-bit
- * ones, which are values in native byte order. BMP writes 0, 1, 5, 6, 7 and 8. A code that a decoder does not
+ * ones, which are values in native byte order. BMP and PNG write 0, 1, 5, 6, 7 and 8. A code that a decoder does not
  * write is not refused: the call succeeds and the output stays as it was.
  */
 enum {
@@ -78,13 +79,13 @@ enum {
  * field is one 32-bit word, in this order.
  */
 typedef struct InputSource {
-    uint32_t kind;        /* PELM_SOURCE_ */
-    uint8_t *data;        /* kind 1: the caller's bytes. Kinds 0 and 2: a staging buffer that the library allocates
-                             and frees; the caller neither sets nor frees it */
-    void *hostContext;    /* the host services' own */
-    int32_t size;         /* bytes at `data` (kind 1), or in the whole stream */
-    int32_t consumed;     /* bytes delivered so far, written by the host services. A read that gives nothing while
-                             consumed == size is an end of data, otherwise a failed read */
+    uint32_t kind;     /* PELM_SOURCE_ */
+    uint8_t *data;     /* kind 1: the caller's bytes. Kinds 0 and 2: a staging buffer that the library allocates
+                          and frees; the caller neither sets nor frees it */
+    void *hostContext; /* the host services' own */
+    int32_t size;      /* bytes at `data` (kind 1), or in the whole stream */
+    int32_t consumed; /* bytes delivered so far, written by the host services (and PNG). A read that gives nothing while
+                         consumed == size is an end of data, otherwise a failed read */
     int32_t hostPosition; /* the host services' own */
     int32_t bufferSize;   /* kinds 0, 2 and 4: proposed size of the buffer for row reads, in bytes. BMP rounds it
                              down to whole rows, or up to one, and writes it back (kinds 0 and 2) */
@@ -92,7 +93,7 @@ typedef struct InputSource {
 
 /*
  * One decode request. Owned by the caller; on a 32-bit system every field is one 32-bit word, in this order.
- * The caller sets `input`, `outputFormat` and `flags`; the rest is the library's.
+ * The caller sets `input`, `outputFormat` and `flags`; the rest is the library's, but for what a call says it reads.
  */
 typedef struct ImageDecodeInfo {
     InputSource *input;
@@ -139,7 +140,7 @@ PELM_API int32_t ZOTARPELMI_DecodeBMP(ImageDecodeInfo *info, void *output, int32
 PELM_API int32_t PELMI_BMP_DestroyBMP(ImageDecodeInfo *info);
 
 /*
- * PNG of every colour type and depth, without interlace so far. An alpha channel, tRNS alphas and a transparent
+ * PNG of every colour type and depth. An alpha channel, tRNS alphas and a transparent
  * colour blend over the buffer in formats 0 and 1 and are carried in the others. docs/formats.md lists what is refused,
  * docs/oddities.md what may surprise.
  *
@@ -157,8 +158,8 @@ PELM_API int32_t ZOTARPELMI_DecodePNG(ImageDecodeInfo *info, void *output, int32
  * no row, destroy the decode and use the one-shot call. */
 PELM_API int32_t ZOTARPELMI_DecodePNGIter(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight);
 
-/* Up to `rows` further rows (all with 0): PELM_RESULT_MORE while rows remain, then PELM_RESULT_DONE. Pixel for pixel
- * every call gets the whole box; scaled output gets a buffer whose first row is the first row of this call. */
+/* Up to `rows` further rows (with 0 no new limit): PELM_RESULT_MORE while rows remain, then PELM_RESULT_DONE. Pixel for
+ * pixel every call gets the whole box; scaled output gets a buffer whose first row is the first row of this call. */
 PELM_API int32_t ZOTARPELMI_DecodePNGLine(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
                                           int32_t rows);
 

@@ -116,6 +116,7 @@ bool allocate_palette(PngDecodeState &state, uint32_t length) {
 }
 
 uint32_t read_plte(PngDecodeState &state, PngInputBuffer &input, uint32_t length) {
+    if ((state.chunkSeenFlags & PNG_SEEN_IHDR) == 0) return PNG_FORMAT_ERROR;
     if (length % 3 != 0 || length > palette_block) return PNG_FORMAT_ERROR;
     if (!allocate_palette(state, length)) return PNG_NO_MEMORY;
     state.paletteCount = length / 3;
@@ -141,20 +142,26 @@ uint32_t read_trns(PngDecodeState &state, PngInputBuffer &input, uint32_t length
     return PNG_DONE;
 }
 
-// Reads or skips the data of one chunk, whose checksum is right.
+bool is_kept(const PngDecodeState &state, uint32_t type) {
+    switch (type) {
+    case chunk_type("IHDR"):
+    case chunk_type("IDAT"):
+    case chunk_type("IEND"):
+    case chunk_type("tRNS"): return true;
+    case chunk_type("PLTE"): return state.colourType == 3 || (state.chunkSeenFlags & PNG_SEEN_IHDR) == 0;
+    default: return false;
+    }
+}
+
+// The data of a chunk that is kept, up to its checksum.
 uint32_t read_chunk(PngDecodeState &state, PngInputBuffer &input, uint32_t length, uint32_t type) {
     switch (type) {
     case chunk_type("IHDR"): return read_ihdr(state, input, length);
     case chunk_type("IDAT"): return read_idat(state, input, length);
-    case chunk_type("IEND"): return length == 0 ? PNG_DONE : PNG_FORMAT_ERROR;
     case chunk_type("tRNS"): return read_trns(state, input, length, type);
-    case chunk_type("PLTE"):
-        if ((state.chunkSeenFlags & PNG_SEEN_IHDR) == 0) return PNG_FORMAT_ERROR;
-        if (state.colourType == 3) return read_plte(state, input, length);
-        break;
-    default: break;
+    case chunk_type("PLTE"): return read_plte(state, input, length);
+    default: return length == 0 ? PNG_DONE : PNG_FORMAT_ERROR; // IEND
     }
-    return skip_bytes(input, length) ? PNG_DONE : PNG_FORMAT_ERROR;
 }
 
 uint32_t parse_chunk(PngDecodeState &state, PngInputBuffer &input, uint32_t &length) {
@@ -164,9 +171,15 @@ uint32_t parse_chunk(PngDecodeState &state, PngInputBuffer &input, uint32_t &len
     const DataPlace data = {input.bufferStart, input.readPos, input.bytesLeft};
     if (!checksum_matches(input, type, length)) return PNG_BAD_DATA;
     if (!go_back(input, data)) return PNG_FORMAT_ERROR;
-    const uint32_t code = read_chunk(state, input, length, type);
-    if (code != PNG_DONE) return code;
-    return skip_bytes(input, checksum_bytes) ? PNG_DONE : PNG_FORMAT_ERROR;
+
+    uint64_t left = checksum_bytes;
+    if (is_kept(state, type)) {
+        const uint32_t code = read_chunk(state, input, length, type);
+        if (code != PNG_DONE) return code;
+    } else {
+        left += length;
+    }
+    return skip_bytes(input, left) ? PNG_DONE : PNG_FORMAT_ERROR;
 }
 
 } // namespace

@@ -4,6 +4,7 @@
 #include "frame/host.h"
 #include "frame/placement.h"
 #include "png/chunks.h"
+#include "png/driver.h"
 #include "png/entry.h"
 #include "png/image_data.h"
 #include "png/placing.h"
@@ -24,33 +25,10 @@ void free_block(Block *&block) {
     block = nullptr;
 }
 
-bool is_readable(const InputSource *source) {
-    if (source == nullptr) return false;
-    switch (source->kind) {
-    case PELM_SOURCE_MEMORY: return source->data != nullptr && source->size > 0;
-    case PELM_SOURCE_STREAM:
-    case PELM_SOURCE_STREAM_ALT:
-    case PELM_SOURCE_SEQUENTIAL: return true;
-    default: return false;
-    }
-}
-
-bool open_reader(PngDecodeState &state, InputSource &source) {
+bool make_reader(PngDecodeState &state, InputSource &source) {
     state.input = new_record<PngInputBuffer>();
-    if (state.input == nullptr) return false;
-    PngInputBuffer &reader = *state.input;
-    reader.source = &source;
-    reader.sourceSize = static_cast<uint32_t>(source.size);
     state.readsMemory = source.kind == PELM_SOURCE_MEMORY ? 1 : 0;
-    if (state.readsMemory != 0) {
-        reader.data = source.data;
-        reader.bytesLeft = reader.sourceSize;
-        return true;
-    }
-    reader.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(PNG_READ_BUFFER_SIZE));
-    if (reader.data == nullptr) return false;
-    ZOTARPELM_Seek_IO(&source, 0, 0);
-    return true;
+    return state.input != nullptr && open_reader(*state.input, source);
 }
 
 uint32_t *new_words(uint64_t count) {
@@ -74,7 +52,7 @@ uint32_t set_up(ImageDecodeInfo &info, int32_t boxWidth, int32_t boxHeight) {
     info.decoderState = state;
     state->rotationDegrees = static_cast<uint32_t>(rotation_of(info.flags));
     state->iterativeMode = info.iterative;
-    const bool parsed = open_reader(*state, *info.input) && __PELMI_PngParserMain(state, state->input) == PNG_DONE &&
+    const bool parsed = make_reader(*state, *info.input) && __PELMI_PngParserMain(state, state->input) == PNG_DONE &&
                         state->imageWidth != 0 && state->imageHeight != 0;
     if (!parsed) {
         PELMI_DestroyDecodePng(&info);
@@ -126,34 +104,41 @@ uint32_t run_loop(ImageDecodeInfo &info, PngDecodeState &state) {
 }
 
 } // namespace
+
+uint32_t drive_png(ImageDecodeInfo &info, void *output, int32_t boxWidth, int32_t boxHeight, int32_t rows,
+                   CallStyle style) {
+    if (info.decoderState == nullptr) {
+        const uint32_t code = set_up(info, boxWidth, boxHeight);
+        if (code != PNG_ROWS_REMAIN) return code;
+    } else if (!come_back(info, *static_cast<PngDecodeState *>(info.decoderState))) {
+        PELMI_DestroyDecodePng(&info);
+        return PNG_NO_MEMORY;
+    }
+
+    PngDecodeState &state = *static_cast<PngDecodeState *>(info.decoderState);
+    if (state.interlaceMethod != 0 && rows != 0 && rows != info.imageHeight) {
+        PELMI_DestroyDecodePng(&info); // passes cannot be decoded by lines
+        return PNG_BAD_LINE_REQUEST;
+    }
+    use_output(state, output, boxWidth, boxHeight);
+    if (rows > 0) state.stopRow = state.rowsDone + static_cast<uint32_t>(rows);
+    state.firstRowOfCall = state.rowsDone;
+    state.bandBase = style == CallStyle::line ? state.firstRowOfCall : 0;
+    const uint32_t code = run_loop(info, state);
+    switch (code) {
+    case PNG_ROWS_REMAIN: return code;
+    case PNG_ENDED_EARLY: return PNG_DONE; // the rows before the bad code are the result
+    default: PELMI_DestroyDecodePng(&info); return code;
+    }
+}
+
 } // namespace pelm
 
 uint32_t PELMI_FastImgDecodePng(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
                                 int32_t rows) {
     if (info == nullptr) return PNG_NO_MEMORY;
-    if (info->decoderState == nullptr) {
-        const uint32_t code = pelm::set_up(*info, boxWidth, boxHeight);
-        if (code != PNG_ROWS_REMAIN) return code;
-    } else if (!pelm::come_back(*info, *static_cast<PngDecodeState *>(info->decoderState))) {
-        PELMI_DestroyDecodePng(info);
-        return PNG_NO_MEMORY;
-    }
-
-    PngDecodeState &state = *static_cast<PngDecodeState *>(info->decoderState);
-    if (state.interlaceMethod != 0 && rows != 0 && rows != info->imageHeight) {
-        PELMI_DestroyDecodePng(info); // passes cannot be decoded by lines
-        return PNG_BAD_LINE_REQUEST;
-    }
-    pelm::use_output(state, output, boxWidth, boxHeight);
-    if (rows > 0) state.stopRow = state.rowsDone + static_cast<uint32_t>(rows);
-    state.firstRowOfCall = state.rowsDone;
-    state.bandBase = rows > 0 ? state.firstRowOfCall : 0;
-    const uint32_t code = pelm::run_loop(*info, state);
-    switch (code) {
-    case PNG_ROWS_REMAIN: return code;
-    case PNG_ENDED_EARLY: return PNG_DONE; // the rows before the bad code are the result
-    default: PELMI_DestroyDecodePng(info); return code;
-    }
+    const pelm::CallStyle style = info->iterative != 0 ? pelm::CallStyle::iterative : pelm::CallStyle::line;
+    return pelm::drive_png(*info, output, boxWidth, boxHeight, rows, style);
 }
 
 uint32_t PELMI_DestroyDecodePng(ImageDecodeInfo *info) {

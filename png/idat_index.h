@@ -5,7 +5,7 @@
 
 namespace pelm {
 
-// Adds the chunk whose data begins at the read position. False without memory; the index stays as it was.
+// Adds the chunk whose data begins at the read position. False without memory; the index may be gone then.
 bool index_idat(PngDecodeState &state, const PngInputBuffer &input, uint32_t length);
 
 } // namespace pelm

@@ -38,16 +38,16 @@ void write_in_place(const PngDecodeState &state, const PassGrid &grid, uint32_t 
 // Without a frame each output pixel shows the source pixel under its centre.
 template <class Load>
 void write_centres(const PngDecodeState &state, const PassGrid &grid, uint32_t y, const Load &load) {
-    const int64_t step = int64_t{state.outputPixelStep} * pixel_step_unit(state.outputFormat);
+    const OutputSteps steps = output_steps(state);
     const Span rows = showing(y, state.wholeHeight >> 1, state.wholeHeight, state.scaledHeight);
     for (uint64_t m = rows.begin; m < rows.end; ++m) {
         SampleWalk column(state.wholeWidth >> 1, static_cast<int32_t>(state.wholeWidth),
                           static_cast<int32_t>(state.scaledWidth));
-        int64_t position = first_pixel_position(state) + static_cast<int64_t>(m) * state.outputRowStep;
-        for (uint32_t j = 0; j < state.scaledWidth; ++j, position += step, column.advance()) {
+        int64_t position = first_pixel_position(state) + static_cast<int64_t>(m) * steps.row;
+        for (uint32_t j = 0; j < state.scaledWidth; ++j, position += steps.pixel, column.advance()) {
             int32_t index = 0;
             if (pass_pixel(grid, column.at, index))
-                write_row_clipped(state.output, position, step, state.outputFormat, load, index, 1);
+                write_row_clipped(state.output, position, steps.pixel, state.outputFormat, load, index, 1);
         }
     }
 }

@@ -1,5 +1,7 @@
 #include "png/pixels.h"
 
+#include <limits>
+
 #include "frame/write_row.h"
 #include "png/loads.h"
 
@@ -47,5 +49,5 @@ void __PELMI_PngWriteDataToOutputBuffer(PngDecodeState *state, uint32_t row, uin
     } else if (belongs_to_image) {
         pelm::reduce_row(*state);
     }
-    ++state->rowsWritten;
+    if (state->rowsWritten != std::numeric_limits<uint32_t>::max()) ++state->rowsWritten; // surplus rows have no end
 }

@@ -1,5 +1,6 @@
 #include "png/placing.h"
 
+#include <cstdlib>
 #include <limits>
 
 #include "frame/formats.h"
@@ -26,25 +27,22 @@ int64_t pixel_position(const PngDecodeState &state, int64_t column, int64_t row)
     return (row * int64_t{state.outputStride} + column) * bytes_per_pixel(state.outputFormat);
 }
 
-struct Steps {
-    int64_t pixel, row; // in pixels
-};
-
-Steps steps_of(const PngDecodeState &state) {
-    const int64_t stride = state.outputStride;
-    switch (state.rotationDegrees) {
-    case 90: return {stride, -1};
-    case 180: return {-1, -stride};
-    case 270: return {-stride, 1};
-    default: return {1, stride};
-    }
+// Rounded to single precision, also by processors that compute in more: they round when they store.
+template <class Number>
+float single(Number value) {
+    const volatile float stored = static_cast<float>(value);
+    return stored;
 }
 
-// Whether every position that rows and columns can lead to is far below the range of 64 bits, and the steps fit.
+// Whether every position that rows and columns can lead to stays far within 64 bits. Boxes of impossible sizes, and the
+// scaled sizes that follow from them, do not.
 bool positions_fit(const PngDecodeState &state) {
     constexpr int64_t longest_side = std::numeric_limits<int32_t>::max();
-    const int64_t row_bytes = int64_t{state.outputStride} * 4;
-    return state.scaledWidth <= longest_side && state.scaledHeight <= longest_side && row_bytes <= longest_side;
+    if (state.scaledWidth > longest_side || state.scaledHeight > longest_side) return false;
+    constexpr int64_t farthest = int64_t{1} << 61;
+    const int64_t row_bytes = int64_t{state.outputStride} * 4 + 1;
+    const int64_t rows = std::abs(offset_y(state)) + state.scaledWidth + state.scaledHeight + 1;
+    return rows < farthest / row_bytes;
 }
 
 } // namespace
@@ -67,9 +65,8 @@ void scale_png(PngDecodeState &state, uint32_t flags, uint32_t zoom, int32_t box
         state.isOneToOne = zoom == 1 ? 1 : 0;
         return;
     }
-    // Stored as single precision, for processors that compute in more.
-    const volatile float across = static_cast<float>(width) / static_cast<float>(box_x);
-    const volatile float down = static_cast<float>(height) / static_cast<float>(box_y);
+    const float across = single(single(width) / single(box_x));
+    const float down = single(single(height) / single(box_y));
     // Required: the products wrap at 32 bits (docs/oddities.md, "Huge PNG sizes").
     if (across < down) {
         state.scaledHeight = box_y;
@@ -90,12 +87,22 @@ void place_png(PngDecodeState &state, uint32_t flags, int32_t boxWidth, int32_t 
         state.outputOffsetX = margin(boxWidth, sideways ? state.scaledHeight : state.scaledWidth);
         state.outputOffsetY = margin(boxHeight, sideways ? state.scaledWidth : state.scaledHeight);
     }
-    const int32_t pixel_bytes = bytes_per_pixel(state.outputFormat);
-    if (pixel_bytes == 0 || !positions_fit(state)) return;
-    const Steps steps = steps_of(state);
-    state.outputRowStep = static_cast<int32_t>(steps.row * pixel_bytes);
-    state.outputPixelStep = static_cast<int32_t>(steps.pixel * pixel_bytes / pixel_step_unit(state.outputFormat));
-    state.outputCursor = static_cast<intptr_t>(first_pixel_position(state));
+    if (bytes_per_pixel(state.outputFormat) == 0) return;
+    const OutputSteps steps = output_steps(state);
+    state.outputRowStep = static_cast<int32_t>(steps.row);
+    state.outputPixelStep = static_cast<int32_t>(steps.pixel / pixel_step_unit(state.outputFormat));
+    state.outputCursor = positions_fit(state) ? static_cast<intptr_t>(first_pixel_position(state)) : 0;
+}
+
+OutputSteps output_steps(const PngDecodeState &state) {
+    const int64_t pixel = bytes_per_pixel(state.outputFormat);
+    const int64_t row = int64_t{state.outputStride} * pixel;
+    switch (state.rotationDegrees) {
+    case 90: return {row, -pixel};
+    case 180: return {-pixel, -row};
+    case 270: return {-row, pixel};
+    default: return {pixel, row};
+    }
 }
 
 void use_output(PngDecodeState &state, void *output, int32_t boxWidth, int32_t boxHeight) {

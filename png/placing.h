@@ -15,6 +15,13 @@ void place_png(PngDecodeState &state, uint32_t flags, int32_t boxWidth, int32_t 
 // Takes the buffer of the current call, whose box may be another one than the first call's.
 void use_output(PngDecodeState &state, void *output, int32_t boxWidth, int32_t boxHeight);
 
+// In bytes, from the pixels of an image row to each other, and to those of the next row.
+struct OutputSteps {
+    int64_t pixel, row;
+};
+
+OutputSteps output_steps(const PngDecodeState &state);
+
 // Byte offset, in the buffer, of the pixel that shows image pixel (0, 0).
 int64_t first_pixel_position(const PngDecodeState &state);
 

@@ -1,16 +1,19 @@
 // The public PNG calls: which result of the driver means what to a host.
+#include "png/driver.h"
 #include "png/entry.h"
 
 namespace {
 
-int32_t decode(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight, int32_t rows, bool iterative,
-               bool rows_may_remain) {
+using pelm::CallStyle;
+
+int32_t decode(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight, int32_t rows,
+               CallStyle style) {
     info->decodeStarted = 1;
-    info->iterative = iterative ? 1 : 0;
-    switch (PELMI_FastImgDecodePng(info, output, boxWidth, boxHeight, rows)) {
+    info->iterative = style == CallStyle::iterative ? 1 : 0;
+    switch (pelm::drive_png(*info, output, boxWidth, boxHeight, rows, style)) {
     case PNG_DONE: return PELM_RESULT_DONE;
     case PNG_ROWS_REMAIN:
-        if (rows_may_remain) return PELM_RESULT_MORE;
+        if (style != CallStyle::one_shot) return PELM_RESULT_MORE;
         break;
     default: break;
     }
@@ -22,18 +25,18 @@ int32_t decode(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t bo
 
 int32_t ZOTARPELMI_DecodePNG(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight) {
     if (info == nullptr) return PELM_RESULT_FAILED;
-    return decode(info, output, boxWidth, boxHeight, info->imageHeight, false, false);
+    return decode(info, output, boxWidth, boxHeight, info->imageHeight, CallStyle::one_shot);
 }
 
 int32_t ZOTARPELMI_DecodePNGIter(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight) {
     if (info == nullptr) return PELM_RESULT_FAILED;
-    return decode(info, output, boxWidth, boxHeight, 0, true, true);
+    return decode(info, output, boxWidth, boxHeight, 0, CallStyle::iterative);
 }
 
 int32_t ZOTARPELMI_DecodePNGLine(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
                                  int32_t rows) {
     if (info == nullptr) return PELM_RESULT_FAILED;
-    return decode(info, output, boxWidth, boxHeight, rows, false, true);
+    return decode(info, output, boxWidth, boxHeight, rows, CallStyle::line);
 }
 
 int32_t ZOTARPELMI_DestroyPNGInfo(ImageDecodeInfo *info) {

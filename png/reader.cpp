@@ -36,6 +36,31 @@ void go_to_next_chunk(PngDecodeState &state, PngInputBuffer &input, uint32_t &en
 
 } // namespace
 
+bool is_readable(const InputSource *source) {
+    if (source == nullptr) return false;
+    switch (source->kind) {
+    case PELM_SOURCE_MEMORY: return source->data != nullptr && source->size > 0;
+    case PELM_SOURCE_STREAM:
+    case PELM_SOURCE_STREAM_ALT:
+    case PELM_SOURCE_SEQUENTIAL: return true;
+    default: return false;
+    }
+}
+
+bool open_reader(PngInputBuffer &input, InputSource &source) {
+    input.source = &source;
+    input.sourceSize = static_cast<uint32_t>(source.size);
+    if (source.kind == PELM_SOURCE_MEMORY) {
+        input.data = source.data;
+        input.bytesLeft = input.sourceSize;
+        return true;
+    }
+    input.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(PNG_READ_BUFFER_SIZE));
+    if (input.data == nullptr) return false;
+    ZOTARPELM_Seek_IO(&source, 0, 0);
+    return true;
+}
+
 bool have_bytes(PngInputBuffer &input, uint32_t need) {
     while (input.bytesLeft < need) {
         const uint32_t refilled = input.bytesLeft == 0 ? __checkbuffer_util1(&input, static_cast<int32_t>(need))
@@ -85,7 +110,7 @@ uint32_t __checkbuffer_util1(PngInputBuffer *input, int32_t need) {
 
 uint32_t __checkbuffer_util2(PngInputBuffer *input, uint32_t need) {
     if (need + input->bytesLeft > PNG_READ_BUFFER_SIZE || pelm::reads_memory(*input)) return PNG_INPUT_ENDED;
-    ZOTARPELM_OsMemcpy(input->data, input->data + input->readPos, input->bytesLeft);
+    if (input->readPos != 0) ZOTARPELM_OsMemcpy(input->data, input->data + input->readPos, input->bytesLeft);
     const uint32_t room = std::min(input->readPos, PNG_READ_BUFFER_SIZE - input->bytesLeft);
     const uint32_t got = pelm::read_from_host(*input, input->data + input->bytesLeft, room);
     input->readPos = 0;

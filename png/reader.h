@@ -1,7 +1,6 @@
 // The buffered reader through which the chunk parser and the image-data loops take PNG input.
 //
-// A refill that brings nothing leaves nothing to read: what needed the bytes fails. Memory is never refilled; the
-// host's read service is not asked for it.
+// What needs more bytes than there are fails. Memory is never refilled; the host's read service is not asked for it.
 #pragma once
 
 #include "png/state.h"
@@ -21,7 +20,13 @@ PELM_EXPORT uint32_t __PELMI_PngGetUINT32(const uint8_t *bytes);
 
 namespace pelm {
 
-// True when at least `need` bytes (4 at most) are buffered, after refills if that takes some.
+// Whether PNG can be decoded from there at all.
+bool is_readable(const InputSource *source);
+
+// Makes the zeroed `input` read from the beginning of a readable source. False without memory for the read buffer.
+bool open_reader(PngInputBuffer &input, InputSource &source);
+
+// True when at least `need` bytes (a few) are buffered, after refills if that takes some.
 bool have_bytes(PngInputBuffer &input, uint32_t need);
 
 // The caller has made sure that they are there.

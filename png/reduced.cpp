@@ -41,9 +41,9 @@ void add_sample_line(const PngDecodeState &state, uint32_t line) {
 
 void write_finished_row(const PngDecodeState &state) {
     const int64_t row = int64_t{state.rowsDone} - state.bandBase;
-    const int64_t position = first_pixel_position(state) + row * state.outputRowStep;
-    const int64_t step = int64_t{state.outputPixelStep} * pixel_step_unit(state.outputFormat);
-    write_row_clipped(state.output, position, step, state.outputFormat, WeightedRow{state.resizeOutAccum}, 0,
+    const OutputSteps steps = output_steps(state);
+    const int64_t position = first_pixel_position(state) + row * steps.row;
+    write_row_clipped(state.output, position, steps.pixel, state.outputFormat, WeightedRow{state.resizeOutAccum}, 0,
                       static_cast<int32_t>(state.scaledWidth));
     ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
 }
@@ -66,12 +66,26 @@ void count_sampled_rows(PngDecodeState &state, uint64_t source_row) {
     state.resizeState = started > finished ? 1 : 0;
 }
 
+// Passes over a source row of which nothing can be seen, without walking through the output rows that it finishes. The
+// row in progress must be right all the same: a later call may show it.
+void pass_over_row(PngDecodeState &state) {
+    const uint32_t finished_before = state.rowsDone;
+    const uint32_t line_before = state.resizeState;
+    count_sampled_rows(state, state.rowsWritten);
+    if (state.resizeRowAccum == nullptr || state.resizeOutAccum == nullptr) return;
+    const bool finished_some = state.rowsDone != finished_before;
+    if (finished_some) ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
+    if (state.resizeState == 0 || (line_before != 0 && !finished_some)) return;
+    unpack_row(state);
+    add_sample_line(state, 0);
+}
+
 } // namespace
 
 void reduce_row(PngDecodeState &state) {
     const uint32_t source_row = state.rowsWritten;
-    const bool visible = state.output.size != 0 && state.resizeRowAccum != nullptr && state.resizeOutAccum != nullptr;
-    if (!visible) return count_sampled_rows(state, source_row);
+    if (state.output.size == 0 || state.resizeRowAccum == nullptr || state.resizeOutAccum == nullptr)
+        return pass_over_row(state);
     if (state.rowsDone >= state.scaledHeight || next_sampled_row(state) != source_row) return;
 
     unpack_row(state);

@@ -7,21 +7,6 @@ namespace {
 
 constexpr uint32_t alpha_colour_type = 4; // bit of the colour type
 
-bool open_reader(PngInputBuffer &reader, InputSource &source) {
-    reader.source = &source;
-    reader.sourceSize = static_cast<uint32_t>(source.size);
-    if (source.kind == PELM_SOURCE_MEMORY) {
-        if (source.data == nullptr || source.size <= 0) return false;
-        reader.data = source.data;
-        reader.bytesLeft = reader.sourceSize;
-        return true;
-    }
-    reader.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(PNG_READ_BUFFER_SIZE));
-    if (reader.data == nullptr) return false;
-    ZOTARPELM_Seek_IO(&source, 0, 0);
-    return true;
-}
-
 void free_block(void *block) {
     if (block != nullptr) ZOTARPELM_OsFree(block);
 }
@@ -29,9 +14,9 @@ void free_block(void *block) {
 } // namespace
 
 uint32_t PELMI_GetAlphaTrFlag(ImageDecodeInfo *info) {
-    if (info == nullptr || info->input == nullptr) return 0;
+    if (info == nullptr || !pelm::is_readable(info->input)) return 0;
     PngInputBuffer reader{};
-    if (!open_reader(reader, *info->input)) return 0;
+    if (!pelm::open_reader(reader, *info->input)) return 0;
     auto *const state = static_cast<PngDecodeState *>(ZOTARPELM_OsMalloc(sizeof(PngDecodeState)));
     // Required: without memory for the record the read buffer is not freed, and otherwise only for kind 0
     // (docs/oddities.md, "PELMI_GetAlphaTrFlag leaks").

@@ -89,7 +89,8 @@ HuffmanNode *__PELMI_PngBuildHuffmanTable(const uint8_t *codeLengths, uint32_t c
     Path path{};
     path.nodes[0] = root;
 
-    // The longest codes first, so that a shorter one that claims the same place comes last and wins it.
+    // The longest codes first: in an over-subscribed code a shorter one may end on their way, and then counts for
+    // nothing.
     for (uint32_t length = longest_code; length > 0; --length) {
         const uint16_t *const symbols = codes.symbols + codes.begin[length];
         for (uint32_t i = 0; i < codes.of_length[length]; ++i) {

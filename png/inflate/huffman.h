@@ -38,7 +38,8 @@ static_assert(sizeof(HuffmanNode) == 20 && sizeof(HuffmanNodePool) == 50008);
 enum HuffmanAlphabetKind : uint32_t { HUFFMAN_LITERAL_LENGTH = 0, HUFFMAN_DISTANCE = 1, HUFFMAN_CODE_LENGTH = 2 };
 
 // Builds the tree of `count` code lengths (0 to 15; 0: unused symbol) behind what the pool already holds, and returns
-// its root. Checks nothing: an incomplete code has missing branches, of an over-subscribed one later codes win.
+// its root. Checks nothing: an incomplete code has missing branches; of an over-subscribed one longer codes win, and
+// among equally long ones the later.
 PELM_EXPORT HuffmanNode *__PELMI_PngBuildHuffmanTable(const uint8_t *codeLengths, uint32_t count, uint32_t kind,
                                                       HuffmanNodePool *pool);
 

@@ -60,21 +60,20 @@ Stop read_block_header(InflateState &now, Input &input, HuffmanNodePool *&pool) 
     }
 }
 
-inline Stop end_block(InflateState &now, bool pause_at_blocks) {
+inline Stop end_block(InflateState &now) {
     now.step = now.final_block ? Step::ended : Step::block_header;
-    if (now.final_block) return Stop::finished;
-    return pause_at_blocks ? Stop::block_ended : Stop::go_on;
+    return now.final_block ? Stop::finished : Stop::block_ended;
 }
 
 template <class Input>
-Stop copy_stored(InflateState &now, Input &input, bool pause_at_blocks) {
+Stop copy_stored(InflateState &now, Input &input) {
     Window &window = now.window;
     const uint32_t wanted = std::min(now.stored_left, room(window));
     const uint32_t got = take_bytes(now.bits, input, window.bytes + window.write, wanted);
     produced(window, got);
     now.stored_left -= got;
     if (got < wanted) return Stop::input_ended_stored;
-    return now.stored_left == 0 ? end_block(now, pause_at_blocks) : Stop::go_on;
+    return now.stored_left == 0 ? end_block(now) : Stop::go_on;
 }
 
 // The length symbol's extra bits and the distance that follows it.
@@ -104,7 +103,7 @@ inline void copy_pending_match(InflateState &now) {
 
 // Literals and matches until the block ends or the window is full.
 template <class Input>
-Stop read_symbols(InflateState &now, Input &input, bool pause_at_blocks) {
+Stop read_symbols(InflateState &now, Input &input) {
     BitReader bits = now.bits;
     Stop stop = Stop::go_on;
     while (stop == Stop::go_on && now.step == Step::symbols && room(now.window) != 0) {
@@ -128,8 +127,7 @@ Stop read_symbols(InflateState &now, Input &input, bool pause_at_blocks) {
             stop = Stop::bad_code;
         else {
             drop(bits, symbol.bits);
-            stop = symbol.op == HUFFMAN_END_OF_BLOCK ? end_block(now, pause_at_blocks)
-                                                     : read_match(now, bits, input, symbol);
+            stop = symbol.op == HUFFMAN_END_OF_BLOCK ? end_block(now) : read_match(now, bits, input, symbol);
             if (now.step == Step::copy) copy_pending_match(now);
         }
     }
@@ -138,34 +136,35 @@ Stop read_symbols(InflateState &now, Input &input, bool pause_at_blocks) {
 }
 
 template <class Input>
-Stop run_step(InflateState &now, Input &input, HuffmanNodePool *&pool, bool pause_at_blocks) {
+Stop run_step(InflateState &now, Input &input, HuffmanNodePool *&pool) {
     switch (now.step) {
     case Step::zlib_header: return read_zlib_header(now, input);
     case Step::block_header: return read_block_header(now, input, pool);
-    case Step::stored: return copy_stored(now, input, pause_at_blocks);
-    case Step::symbols: return read_symbols(now, input, pause_at_blocks);
+    case Step::stored: return copy_stored(now, input);
+    case Step::symbols: return read_symbols(now, input);
     case Step::copy: copy_pending_match(now); return Stop::go_on;
     case Step::ended: break;
     }
     return Stop::finished;
 }
 
-// `pool` takes the trees of dynamic blocks; allocated for the first of them, and owned by whoever owns the pointer.
-//
 // Goes on with the stream until `rows` or the stream itself says stop; with `pause_at_blocks` also at the end of every
-// block but the last. Called again after rows_done or block_ended it continues at the same bit.
+// block but the last. Called again after rows_done or block_ended it continues at the same bit, in either mode. It runs
+// ahead of its rows up to the end of the window or of the block, whichever comes first.
+//
+// `pool` takes the trees of dynamic blocks; allocated for the first of them, and owned by whoever owns the pointer.
 template <class Input, class Rows>
 Stop inflate(InflateState &state, Input &input, Rows &rows, HuffmanNodePool *&pool, bool pause_at_blocks) {
     for (;;) {
         const bool must_deliver = state.held != Stop::go_on || room(state.window) == 0;
         const Stop rows_say = must_deliver ? deliver(state.window, rows) : Stop::go_on;
         if (rows_say != Stop::go_on) return rows_say;
-        if (state.held != Stop::go_on) break;
-        state.held = run_step(state, input, pool, pause_at_blocks);
+
+        const Stop held = state.held;
+        if (held == Stop::block_ended) state.held = Stop::go_on; // everything else is for good
+        if (held == Stop::block_ended ? pause_at_blocks : held != Stop::go_on) return held;
+        state.held = run_step(state, input, pool);
     }
-    const Stop held = state.held;
-    if (held == Stop::block_ended) state.held = Stop::go_on; // everything else stays as it is
-    return held;
 }
 
 } // namespace pelm
