@@ -26,12 +26,14 @@ void undo_up(uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t 
         row[i] = static_cast<uint8_t>(row[i] + above[i]);
 }
 
+// Byte by byte, from byte `i` on: the whole filter, and the end of a row that is no whole pixel.
 template <class D>
-void undo_average(uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length, D distance) {
+void undo_average_from(uint32_t i, uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length,
+                       D distance) {
     const uint32_t first = std::min<uint32_t>(distance, length);
-    for (uint32_t i = 0; i < first; ++i)
+    for (; i < first; ++i)
         row[i] = static_cast<uint8_t>(row[i] + (above[i] >> 1));
-    for (uint32_t i = distance; i < length; ++i)
+    for (; i < length; ++i)
         row[i] = static_cast<uint8_t>(row[i] + ((row[i - distance] + above[i]) >> 1));
 }
 
@@ -51,12 +53,23 @@ inline Lanes paeth(Lanes a, Lanes b, Lanes c) {
 }
 
 template <class D>
-void undo_paeth(uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length, D distance) {
+void undo_paeth_from(uint32_t i, uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length,
+                     D distance) {
     const uint32_t first = std::min<uint32_t>(distance, length);
-    for (uint32_t i = 0; i < first; ++i)
+    for (; i < first; ++i)
         row[i] = static_cast<uint8_t>(row[i] + above[i]);
-    for (uint32_t i = distance; i < length; ++i)
+    for (; i < length; ++i)
         row[i] = static_cast<uint8_t>(row[i] + paeth(row[i - distance], above[i], above[i - distance]));
+}
+
+template <class D>
+void undo_average(uint8_t *row, const uint8_t *above, uint32_t length, D distance) {
+    undo_average_from(0, row, above, length, distance);
+}
+
+template <class D>
+void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length, D distance) {
+    undo_paeth_from(0, row, above, length, distance);
 }
 
 // Whole pixels, whose left neighbours stay in registers.
@@ -72,32 +85,35 @@ void undo_paeth(uint8_t *__restrict row, const uint8_t *__restrict above, uint32
             above_left[k] = up;
             row[i + k] = static_cast<uint8_t>(left[k]);
         }
-    for (uint32_t k = 0; i < length; ++i, ++k)
-        row[i] = static_cast<uint8_t>(row[i] + paeth(left[k], above[i], above_left[k]));
+    undo_paeth_from(i, row, above, length, Distance<distance>());
 }
 
 // Pixels of four bytes and more, all channels of one at a time.
 template <uint32_t distance>
-requires(lanes_are_fast &&distance >= 3) void undo_average(uint8_t *row, const uint8_t *above, uint32_t length,
+requires(lanes_are_fast &&distance >= 4) void undo_average(uint8_t *row, const uint8_t *above, uint32_t length,
                                                            Distance<distance>) {
     Lanes left{};
-    for (uint32_t i = 0; i + distance <= length; i += distance) {
+    uint32_t i = 0;
+    for (; i + distance <= length; i += distance) {
         left = low_byte(load_lanes<distance>(row + i) + ((left + load_lanes<distance>(above + i)) >> 1));
         store_lanes<distance>(row + i, left);
     }
+    undo_average_from(i, row, above, length, Distance<distance>());
 }
 
 template <uint32_t distance>
-requires(lanes_are_fast &&distance >= 3) void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length,
+requires(lanes_are_fast &&distance >= 4) void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length,
                                                          Distance<distance>) {
     Lanes left{};
     Lanes above_left{};
-    for (uint32_t i = 0; i + distance <= length; i += distance) {
+    uint32_t i = 0;
+    for (; i + distance <= length; i += distance) {
         const Lanes up = load_lanes<distance>(above + i);
         left = low_byte(load_lanes<distance>(row + i) + paeth(left, up, above_left));
         above_left = up;
         store_lanes<distance>(row + i, left);
     }
+    undo_paeth_from(i, row, above, length, Distance<distance>());
 }
 
 template <class D>
