@@ -1,4 +1,5 @@
-// BMP: 12 megapixels pixel for pixel, against memcpy of the output and stb_image, and reduced to a small box.
+#include "bench/bmp_bench.h"
+
 #include <benchmark/benchmark.h>
 
 #include <cstring>
@@ -6,12 +7,10 @@
 
 #include "PelmHost.h"
 #include "bench/bmp_pictures.h"
-#include "bench/ratio_reporter.h"
 #include "bench/stb_peer.h"
 
+namespace bench {
 namespace {
-
-using bench::photo_bmp;
 
 constexpr int32_t width = 4000;
 constexpr int32_t height = 3000;
@@ -73,7 +72,7 @@ void copy(benchmark::State &state, Format format) {
 void decode_with_stb(benchmark::State &state, int32_t bits_per_pixel) {
     const std::vector<uint8_t> &file = file_of_depth(bits_per_pixel);
     for (auto _ : state)
-        if (!bench::stb_decode_rgba(file)) state.SkipWithError("decode failed");
+        if (!stb_decode_rgba(file)) state.SkipWithError("decode failed");
 }
 
 template <class... Arguments>
@@ -97,12 +96,9 @@ void add_depth(int32_t bits_per_pixel) {
 
 } // namespace
 
-int main(int count, char **arguments) {
+void add_bmp_benchmarks() {
     for (const int32_t bits_per_pixel : {1, 4, 8, 16, 24, 32})
         add_depth(bits_per_pixel);
-    benchmark::Initialize(&count, arguments);
-    if (benchmark::ReportUnrecognizedArguments(count, arguments)) return 1;
-    bench::RatioReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
-    return 0;
 }
+
+} // namespace bench

@@ -13,8 +13,10 @@ class RatioReporter : public benchmark::ConsoleReporter {
 public:
     void ReportRuns(const std::vector<Run> &runs) override;
     void Finalize() override;
+    bool has_failures() const { return has_failures_; }
 
 private:
+    bool has_failures_ = false;
     std::map<std::string, std::map<std::string, double>> best_; // work, who -> CPU time of one iteration
 };
 

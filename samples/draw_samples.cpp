@@ -1,7 +1,9 @@
 // draw-samples FOLDER: writes the sample images there.
+#include <algorithm>
 #include <cstdio>
 
 #include "samples/bmp_writer.h"
+#include "samples/png_writer.h"
 #include "samples/quantise.h"
 #include "samples/scene.h"
 
@@ -59,8 +61,61 @@ BmpContents sixteen_bits(const Drawing &drawing, Fields f, bool with_masks) {
     return contents;
 }
 
-bool write_all(const std::string &folder) {
-    const Drawing scene = draw_scene();
+// The scene fades out towards a frame of round corners.
+int alpha_at(int x, int y, const Drawing &drawing) {
+    constexpr int fade = 40;
+    const int across = std::max(0, fade - std::min(x, drawing.width - 1 - x));
+    const int down = std::max(0, fade - std::min(y, drawing.height - 1 - y));
+    const int off = across * across + down * down;
+    return std::clamp(255 - off * 255 / (fade * fade), 0, 255);
+}
+
+PngContents png(const Drawing &drawing, PngColour colour, std::vector<uint8_t> samples) {
+    return {drawing.width, drawing.height, colour, std::move(samples)};
+}
+
+PngContents rgb_png(const Drawing &drawing) {
+    std::vector<uint8_t> samples;
+    for (const Colour &c : drawing.pixels) {
+        for (const int channel : {c.r, c.g, c.b})
+            samples.push_back(static_cast<uint8_t>(channel));
+    }
+    return png(drawing, PngColour::rgb, std::move(samples));
+}
+
+// In chunks of 4096 bytes.
+PngContents alpha_png(const Drawing &drawing) {
+    std::vector<uint8_t> samples;
+    for (int y = 0; y < drawing.height; ++y) {
+        for (int x = 0; x < drawing.width; ++x) {
+            const Colour &c = drawing.at(x, y);
+            for (const int channel : {c.r, c.g, c.b, alpha_at(x, y, drawing)})
+                samples.push_back(static_cast<uint8_t>(channel));
+        }
+    }
+    PngContents contents = png(drawing, PngColour::rgb_alpha, std::move(samples));
+    contents.longest_chunk = 4096;
+    return contents;
+}
+
+PngContents grey_png(const Drawing &drawing) {
+    std::vector<uint8_t> samples;
+    for (const Colour &c : drawing.pixels)
+        samples.push_back(static_cast<uint8_t>((299 * c.r + 587 * c.g + 114 * c.b + 500) / 1000));
+    return png(drawing, PngColour::grey, std::move(samples));
+}
+
+// The darkest colours of the palette are half transparent.
+PngContents palette_png(const Drawing &drawing) {
+    const BmpContents stored = indexed(drawing, 8, suitable_palette(drawing, 256));
+    PngContents contents = png(drawing, PngColour::palette, {stored.values.begin(), stored.values.end()});
+    contents.palette = stored.palette;
+    for (const Colour &c : stored.palette)
+        contents.alphas.push_back(c.r + c.g + c.b < 150 ? 128 : 255);
+    return contents;
+}
+
+bool write_bmps(const std::string &folder, const Drawing &scene) {
     BmpContents topdown = direct(scene, 24);
     topdown.top_down = true;
     const auto write = [&](const char *name, const BmpContents &contents) {
@@ -73,6 +128,18 @@ bool write_all(const std::string &folder) {
            write("sunset-8.bmp", indexed(scene, 8, suitable_palette(scene, 256))) &&
            write("sunset-4.bmp", indexed(scene, 4, suitable_palette(scene, 16))) &&
            write("sunset-1.bmp", indexed(scene, 1, {{28, 20, 60}, {255, 214, 150}}));
+}
+
+bool write_pngs(const std::string &folder, const Drawing &scene) {
+    return write_png(folder + "/sunset.png", rgb_png(scene)) &&
+           write_png(folder + "/sunset-alpha.png", alpha_png(scene)) &&
+           write_png(folder + "/sunset-palette.png", palette_png(scene)) &&
+           write_png(folder + "/sunset-grey.png", grey_png(scene));
+}
+
+bool write_all(const std::string &folder) {
+    const Drawing scene = draw_scene();
+    return write_bmps(folder, scene) && write_pngs(folder, scene);
 }
 
 } // namespace

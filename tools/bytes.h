@@ -1,4 +1,4 @@
-// Little-endian reads from files. Out-of-range bytes read as 0.
+// Multi-byte reads from files, in both byte orders. Out-of-range bytes read as 0.
 #pragma once
 
 #include <cstddef>
@@ -19,6 +19,11 @@ inline uint32_t read_le16(Bytes bytes, size_t at) {
 
 inline uint32_t read_le32(Bytes bytes, size_t at) {
     return read_le16(bytes, at) | read_le16(bytes, at + 2) << 16;
+}
+
+inline uint32_t read_be32(Bytes bytes, size_t at) {
+    return byte_at(bytes, at) << 24 | byte_at(bytes, at + 1) << 16 | byte_at(bytes, at + 2) << 8 |
+           byte_at(bytes, at + 3);
 }
 
 } // namespace pelm_tool

@@ -1,4 +1,4 @@
-// pelm-contact-sheet INPUT OUTPUT.png: one image in every BMP output format (rows) and in every rotation and placement
+// pelm-contact-sheet INPUT OUTPUT.png: one image in every output format (rows) and in every rotation and placement
 // (columns), on one sheet.
 #include <algorithm>
 #include <cstdio>
@@ -81,7 +81,14 @@ void Sheet::text(int left, int top, const std::string &words, int scale, Rgba co
     }
 }
 
-// Centred in its box, which it never exceeds. What the decoder left transparent shows the box.
+Rgba over_box(Rgba colour) {
+    const auto mix = [&](int over, int under) {
+        return static_cast<uint8_t>((over * colour.a + under * (255 - colour.a) + 127) / 255);
+    };
+    return {mix(colour.r, box_colour.r), mix(colour.g, box_colour.g), mix(colour.b, box_colour.b), 255};
+}
+
+// Centred in its box, which it never exceeds, and which shows where the picture is transparent.
 void Sheet::picture(int box_left, int box_top, const Picture &picture) {
     const int left = box_left + (box_size - static_cast<int>(picture.width)) / 2;
     const int top = box_top + (box_size - static_cast<int>(picture.height)) / 2;
@@ -89,7 +96,7 @@ void Sheet::picture(int box_left, int box_top, const Picture &picture) {
     for (size_t y = 0; y < picture.height; ++y) {
         for (size_t x = 0; x < picture.width; ++x, pixel += picture.format->bytes) {
             const Rgba colour = picture.format->load(pixel);
-            if (colour.a != 0) put(left + static_cast<int>(x), top + static_cast<int>(y), colour);
+            put(left + static_cast<int>(x), top + static_cast<int>(y), over_box(colour));
         }
     }
 }
@@ -101,13 +108,13 @@ Picture decode_cell(const std::string &name, const char *format, uint32_t turn, 
     options.rotation = turn;
     options.placement = placement;
     Progress progress(false, 1);
-    const Session session(options, progress);
-    Input input(name, SourceChoice::file);
+    Session session(options, progress);
+    Input input(name, SourceChoice::memory);
     const ImageFormat &image = recognise(input.head());
     // Formats without alpha show what is not covered as a background of the box's colour.
     if (!options.format->has_alpha)
         options.background = uint32_t{box_colour.r} << 16 | box_colour.g << 8 | box_colour.b;
-    return decode(input, image, image.describe(input.head(), {input.size(), input.source()->kind}), options, session);
+    return decode(input, image, describe(image, input), options, session).picture;
 }
 
 void draw_captions(Sheet &sheet) {

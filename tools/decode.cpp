@@ -5,18 +5,12 @@
 
 #include "tools/failure.h"
 #include "tools/interrupt.h"
+#include "tools/png_decode.h"
 
 namespace pelm_tool {
 namespace {
 
 constexpr uint64_t largest_output = uint64_t{1} << 31; // bytes
-
-int32_t tell_progress(void *user, const InputSource *source) {
-    if (source != nullptr && source->size > 0) {
-        static_cast<Progress *>(user)->at(static_cast<double>(source->consumed) / source->size);
-    }
-    return 0;
-}
 
 bool is_quarter_turn(const Options &options) {
     return options.rotation == PELM_ROTATE_90 || options.rotation == PELM_ROTATE_270;
@@ -60,65 +54,125 @@ Picture blank_picture(const Options &options, int32_t width, int32_t height) {
 struct Decoding {
     Input &input;
     const ImageFormat &image;
+    const ImageDescription &description;
     const Options &options;
-    const Session &session;
+    Session &session;
     Box box;
 };
+
+uint32_t flags_of(const Options &options) {
+    return options.rotation | options.placement;
+}
 
 std::string memory_failure(const Options &options) {
     if (options.max_memory == 0) return "not enough memory";
     return "the decoder needs more memory than --max-memory allows";
 }
 
-// The library also reports success when it had to leave rows out, so success is looked at as well.
-void throw_if_failed(const Decoding &decoding, int32_t result) {
-    decoding.session.throw_if_stopped();
-    if (decoding.session.counters().failedAllocations > 0) throw Failure(memory_failure(decoding.options));
-    const int read_error = PelmHost_ReadError(decoding.input.source());
-    if (read_error != 0) throw system_failure("cannot read", read_error);
-    if (result != PELM_RESULT_DONE) throw Failure("the decoder refuses it");
+std::string rows_of_all(const Decoding &decoding, int64_t rows) {
+    return std::to_string(rows) + " of " + std::to_string(decoding.description.height) + " rows";
 }
 
-struct ScaledSize {
-    int32_t width;
+// Whether the decoder takes the same bytes from memory.
+bool is_decoded_from_memory(const Decoding &decoding) {
+    std::vector<uint8_t> bytes = decoding.input.all_bytes();
+    InputSource source = {};
+    if (PelmHost_OpenMemory(&source, PELM_SOURCE_MEMORY, bytes.data(), static_cast<int32_t>(bytes.size())) != 0)
+        return false;
+    ImageDecodeInfo info = {};
+    info.input = &source;
+    DecodeJob job{info, decoding.description, decoding.box, {}, nullptr, decoding.session.polls()};
+    const bool decoded = decoding.image.decode(job) == PELM_RESULT_DONE;
+    PelmHost_Close(&source);
+    return decoded;
+}
+
+// Why a file is refused that looks sound from the outside.
+Failure refusal_of(const Decoding &decoding, const DecodeJob &job) {
+    if (!decoding.image.polls_rows) return Failure("the decoder refuses it");
+    const bool is_stream = decoding.input.source()->kind != PELM_SOURCE_MEMORY;
+    if (is_stream && is_decoded_from_memory(decoding))
+        return Failure("the decoder cannot read it from a file or pipe (a chunk begins across its buffer); use "
+                       "--source memory");
+    return Failure("the image data is damaged or cut short after " + rows_of_all(decoding, job.complete_rows));
+}
+
+// The library also reports success when it had to leave rows out, so success is looked at as well.
+void throw_if_failed(const Decoding &decoding, const DecodeJob &job, int32_t result) {
+    decoding.session.throw_if_stopped();
+    if (decoding.session.counters().failedAllocations > 0) throw Failure(memory_failure(decoding.options));
+    decoding.input.throw_if_unreadable();
+    if (result != PELM_RESULT_DONE) throw refusal_of(decoding, job);
+}
+
+struct RunResult {
+    int32_t width; // after scaling
     int32_t height;
+    int64_t complete_rows;
 };
 
-ScaledSize run(const Decoding &decoding, uint8_t *output) {
+RunResult run(const Decoding &decoding, Picture *picture) {
     ImageDecodeInfo info = {};
     info.input = decoding.input.source();
     info.outputFormat = decoding.options.format->code;
-    info.flags = decoding.options.rotation | decoding.options.placement;
-    const int32_t result = decoding.image.decode(&info, output, decoding.box.width, decoding.box.height);
-    throw_if_failed(decoding, result);
+    info.flags = flags_of(decoding.options);
+    DecodeJob job{info, decoding.description, decoding.box, decoding.options.mode, picture, decoding.session.polls()};
+    const int32_t result = decoding.image.decode(job);
+    throw_if_failed(decoding, job, result);
     if (info.outputWidth <= 0 || info.outputHeight <= 0) {
         throw Failure("nothing is left of the image in a box of " +
                       size_words(decoding.box.width, decoding.box.height) + " pixels");
     }
-    return {info.outputWidth, info.outputHeight};
+    return {info.outputWidth, info.outputHeight, job.complete_rows};
+}
+
+std::string shortage_after(const Decoding &decoding, const RunResult &result) {
+    const bool is_whole = !decoding.image.polls_rows || result.complete_rows >= decoding.description.height;
+    if (is_whole) return decoding.description.shortage;
+    return "the image data breaks off after " + rows_of_all(decoding, result.complete_rows);
 }
 
 // The buffer must have exactly the size that the library gives the image: a first run without output tells it.
-Picture decode_exact(const Decoding &decoding) {
-    const ScaledSize size = run(decoding, nullptr);
-    Picture picture = blank_picture(decoding.options, size.width, size.height);
-    run(decoding, picture.bytes.data());
-    return picture;
+Picture blank_picture_for(const Decoding &decoding) {
+    if (decoding.options.placement != PELM_PLACE_EXACT)
+        return blank_picture(decoding.options, decoding.box.width, decoding.box.height);
+    const RunResult first = run(decoding, nullptr);
+    return blank_picture(decoding.options, first.width, first.height);
 }
 
-Picture decode_into_box(const Decoding &decoding) {
-    Picture picture = blank_picture(decoding.options, decoding.box.width, decoding.box.height);
-    run(decoding, picture.bytes.data());
-    return picture;
+// What the decoder does to this kind of image with these options.
+std::vector<std::string> notes_on(const Decoding &decoding) {
+    std::vector<std::string> notes = decoding.description.notes;
+    if (!decoding.image.turns_only_reduced) return notes;
+    const bool keeps_size = keeps_its_size(decoding.description, decoding.box, flags_of(decoding.options));
+    const bool is_grey_8 = decoding.description.is_grey_8;
+    if (decoding.options.rotation != PELM_ROTATE_0 && (keeps_size || is_grey_8))
+        notes.push_back(std::string("the decoder does not turn a PNG ") +
+                        (is_grey_8 ? "with 8 bits of grey" : "at its own size"));
+    if (!keeps_size && is_grey_8)
+        notes.push_back("the decoder fills only a part of the place of a reduced PNG with 8 bits of grey");
+    return notes;
 }
 
 } // namespace
 
-Session::Session(const Options &options, Progress &progress) : control_(PelmHost_NewControl()) {
+int32_t Session::on_progress(void *session, const InputSource *source) {
+    Session &self = *static_cast<Session *>(session);
+    const bool is_poll = source == nullptr;
+    if (is_poll) ++self.polls_;
+    if (self.rows_shown_ > 0) {
+        self.progress_.at(static_cast<double>(self.polls_) / self.rows_shown_);
+    } else if (!is_poll && source->size > 0) {
+        self.progress_.at(static_cast<double>(source->consumed) / source->size);
+    }
+    return 0;
+}
+
+Session::Session(const Options &options, Progress &progress) : control_(PelmHost_NewControl()), progress_(progress) {
     if (control_ == nullptr) throw std::bad_alloc();
     PelmHost_SetMemoryLimits(control_, options.max_memory, 0);
     PelmHost_SetDeadline(control_, options.deadline);
-    PelmHost_SetProgress(control_, tell_progress, &progress);
+    PelmHost_SetProgress(control_, on_progress, this);
     PelmHost_UseForProcess(control_);
     cancel_on_interrupt(control_);
 }
@@ -140,15 +194,21 @@ void Session::throw_if_stopped() const {
     if (PelmHost_StopReason(control_) == ETIMEDOUT) throw Failure("not done before the deadline");
 }
 
-Picture decode(Input &input, const ImageFormat &image, const ImageDescription &description, const Options &options,
-               const Session &session) {
+Decoded decode(Input &input, const ImageFormat &image, const ImageDescription &description, const Options &options,
+               Session &session) {
     if (!description.refusal.empty()) throw Failure(description.refusal);
     if (!writes(image, *options.format)) {
         throw Failure(std::string("the ") + image.name + " decoder does not write the format " + options.format->name);
     }
-    const Decoding decoding{input, image, options, session, box_for(options, description)};
+    if (options.mode.calls != Calls::one_shot && !image.decodes_in_calls) {
+        throw Failure(std::string("the ") + image.name + " decoder has only --mode oneshot so far");
+    }
+    const Decoding decoding{input, image, description, options, session, box_for(options, description)};
     refuse_huge(decoding.box, *options.format);
-    return options.placement == PELM_PLACE_EXACT ? decode_exact(decoding) : decode_into_box(decoding);
+    if (image.polls_rows) session.show_rows(description.height);
+    Picture picture = blank_picture_for(decoding);
+    const RunResult result = run(decoding, &picture);
+    return {std::move(picture), shortage_after(decoding, result), notes_on(decoding)};
 }
 
 } // namespace pelm_tool

@@ -22,12 +22,27 @@ public:
     PelmHostCounters counters() const;
     void throw_if_stopped() const; // Failure: interrupted, or the deadline has passed
 
+    // What the progress line shows: rows of this many, as the decoder polls, instead of bytes of the input.
+    void show_rows(int32_t count) { rows_shown_ = count; }
+    const uint64_t &polls() const { return polls_; } // so far
+
 private:
+    static int32_t on_progress(void *session, const InputSource *source);
+
     PelmHostControl *control_;
+    Progress &progress_;
+    int32_t rows_shown_ = 0; // 0: bytes
+    uint64_t polls_ = 0;
+};
+
+struct Decoded {
+    Picture picture;
+    std::string shortage;           // what is missing of the image; empty: nothing
+    std::vector<std::string> notes; // what the user may not expect
 };
 
 // Throws Failure.
-Picture decode(Input &input, const ImageFormat &image, const ImageDescription &description, const Options &options,
-               const Session &session);
+Decoded decode(Input &input, const ImageFormat &image, const ImageDescription &description, const Options &options,
+               Session &session);
 
 } // namespace pelm_tool

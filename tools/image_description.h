@@ -1,4 +1,4 @@
-// What the tool tells about an image file from its first bytes, whatever its format.
+// What the tool tells about an image file without decoding it, whatever its format.
 #pragma once
 
 #include <cstddef>
@@ -8,12 +8,13 @@
 
 namespace pelm_tool {
 
-// How many of a file's first bytes a description may look at.
+// How many of a file's first bytes tell its format, and describe it where nothing more is read.
 constexpr size_t described_bytes = 66;
 
 struct ImageDescription {
     int32_t width = 0; // as decoded; 0 when the image is refused before it is known
     int32_t height = 0;
+    bool is_grey_8 = false;         // PNG: grey of 8 bits, which is reduced by rules of its own
     std::string words;              // size, depth and variant
     std::string refusal;            // why the decoder refuses it; empty when it does not
     std::string shortage;           // what a truncated file lacks; empty when it is whole

@@ -1,39 +1,68 @@
 #include "tools/image_formats.h"
 
-#include <algorithm>
 #include <cstring>
 #include <string>
 
 #include "tools/bmp_description.h"
 #include "tools/failure.h"
+#include "tools/png_decode.h"
+#include "tools/png_description.h"
 
 namespace pelm_tool {
 namespace {
 
-constexpr uint32_t bmp_formats = 1u << PELM_FORMAT_RGB565 | 1u << PELM_FORMAT_RGB888 | 1u << PELM_FORMAT_ARGB8888 |
-                                 1u << PELM_FORMAT_RGB565_A8 | 1u << PELM_FORMAT_RGBA8888 | 1u << PELM_FORMAT_BGRA8888;
-
-constexpr ImageFormat image_formats[] = {
-    {"BMP", "BM", describe_bmp, ZOTARPELMI_DecodeBMP, bmp_formats},
-    {"PNG", "\x89PNG\r\n\x1A\n", nullptr, nullptr, 0},
-    {"GIF", "GIF8", nullptr, nullptr, 0},
-};
+// What BMP and PNG write.
+constexpr uint32_t common_formats = 1u << PELM_FORMAT_RGB565 | 1u << PELM_FORMAT_RGB888 | 1u << PELM_FORMAT_ARGB8888 |
+                                    1u << PELM_FORMAT_RGB565_A8 | 1u << PELM_FORMAT_RGBA8888 |
+                                    1u << PELM_FORMAT_BGRA8888;
 
 bool begins_with(Bytes head, const char *magic) {
     const size_t length = std::strlen(magic);
     return head.size() >= length && std::memcmp(head.data(), magic, length) == 0;
 }
 
+bool is_bmp(Bytes head) {
+    return begins_with(head, "BM");
+}
+
+bool is_gif(Bytes head) {
+    return begins_with(head, "GIF8");
+}
+
+ImageDescription describe_bmp_input(Input &input) {
+    return describe_bmp(input.head(), {input.size(), input.source()->kind});
+}
+
+ImageDescription describe_png_input(Input &input) {
+    return describe_png(*input.source());
+}
+
+int32_t decode_bmp(DecodeJob &job) {
+    return ZOTARPELMI_DecodeBMP(&job.info, job.output(), job.box.width, job.box.height);
+}
+
+constexpr ImageFormat image_formats[] = {
+    {"BMP", is_bmp, describe_bmp_input, decode_bmp, common_formats, false, false, false, false},
+    {"PNG", begins_like_png, describe_png_input, decode_png, common_formats, true, true, true, true},
+    {"GIF", is_gif, nullptr, nullptr, 0, false, false, false, false},
+};
+
 } // namespace
 
 const ImageFormat &recognise(Bytes head) {
     if (head.empty()) throw Failure("the file is empty");
     for (const ImageFormat &format : image_formats) {
-        if (!begins_with(head, format.magic)) continue;
+        if (!format.recognises(head)) continue;
         if (format.describe == nullptr) throw Failure(std::string(format.name) + " images are not decoded yet");
         return format;
     }
-    throw Failure("not a BMP file (it does not begin with \"BM\")");
+    throw Failure("neither a BMP nor a PNG file (it begins like none of them)");
+}
+
+ImageDescription describe(const ImageFormat &image, Input &input) {
+    const ImageDescription description = image.describe(input);
+    input.throw_if_unreadable();
+    return description;
 }
 
 bool writes(const ImageFormat &image, const PixelFormat &pixels) {

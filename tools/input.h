@@ -18,14 +18,26 @@ public:
     Input(const Input &) = delete;
     Input &operator=(const Input &) = delete;
 
-    InputSource *source() { return &source_; }
+    // Where the choice was automatic: makes it a memory source, or leaves it the file or pipe that it is. Throws
+    // Failure.
+    void settle(bool in_memory);
+
+    InputSource *source() { return is_viewed_ ? &view_ : &source_; }
     Bytes head() const { return head_; } // the first `described_bytes`, or the whole of a shorter file
     int64_t size() const { return source_.size; }
 
+    std::vector<uint8_t> all_bytes(); // leaves the source at its end
+    void throw_if_unreadable();       // Failure, when the last read failed
+
 private:
+    void open();      // throws Failure
     void read_head(); // throws Failure
 
+    std::string name_;
+    SourceChoice choice_;
     InputSource source_ = {};
+    InputSource view_ = {}; // of a spooled pipe's bytes, as a pipe
+    bool is_viewed_ = false;
     std::vector<uint8_t> head_;
 };
 

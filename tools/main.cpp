@@ -48,6 +48,7 @@ private:
     Outcome describe_one(const std::string &name, const ImageDescription &image);
     void write(const Picture &picture, const OutputName &to);
     void tell(const std::string &name, const std::string &what);
+    void warn(const std::string &name, const std::string &of);
     void tell_stats(const std::string &name, double milliseconds, const PelmHostCounters &counters);
 
     const Options &options_;
@@ -58,6 +59,10 @@ private:
 void Run::tell(const std::string &name, const std::string &what) {
     progress_.clear();
     std::fprintf(stderr, "pelm-decode: %s: %s\n", shown_name(name).c_str(), what.c_str());
+}
+
+void Run::warn(const std::string &name, const std::string &of) {
+    if (!options_.quiet) tell(name, "warning: " + of);
 }
 
 void Run::tell_stats(const std::string &name, double milliseconds, const PelmHostCounters &counters) {
@@ -93,22 +98,26 @@ Outcome Run::describe_one(const std::string &name, const ImageDescription &image
 }
 
 Outcome Run::decode_one(const std::string &name, const OutputName *output) {
-    const Session session(options_, progress_);
+    Session session(options_, progress_);
     Input input(name, options_.source);
     const ImageFormat &format = recognise(input.head());
-    const ImageDescription image = format.describe(input.head(), {input.size(), input.source()->kind});
+    input.settle(format.is_read_from_memory);
+    const ImageDescription image = describe(format, input);
+    session.throw_if_stopped();
     if (output == nullptr) return describe_one(name, image);
 
+    const uint64_t reads_before = session.counters().reads;
     const Milliseconds clock;
-    const Picture picture = decode(input, format, image, options_, session);
+    const Decoded decoded = decode(input, format, image, options_, session);
     const double milliseconds = clock.passed();
-    write(picture, *output);
-    if (options_.stats) tell_stats(name, milliseconds, session.counters());
-    for (const std::string &note : image.notes) {
-        if (!options_.quiet) tell(name, "warning: " + note);
-    }
-    if (image.shortage.empty()) return Outcome::done;
-    if (!options_.quiet) tell(name, "warning: " + image.shortage);
+    write(decoded.picture, *output);
+    PelmHostCounters counters = session.counters();
+    counters.reads -= reads_before;
+    if (options_.stats) tell_stats(name, milliseconds, counters);
+    for (const std::string &note : decoded.notes)
+        warn(name, note);
+    if (decoded.shortage.empty()) return Outcome::done;
+    warn(name, decoded.shortage);
     return Outcome::truncated;
 }
 

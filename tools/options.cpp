@@ -16,24 +16,30 @@ constexpr const char *description = "Decodes images with the Pelm image decoder 
                                     "raw pixels.";
 
 constexpr const char *remarks = R"(
-Inputs: BMP files; "-" is standard input. With several inputs OUTPUT is a folder, or has %n (1, 2, ...) or %f (the
-input's name without folder and suffix) in it. "%%" is a percent sign. OUTPUT "-" is standard output.
+Inputs: BMP and PNG files; "-" is standard input. With several inputs OUTPUT is a folder, or has %n (1, 2, ...) or %f
+(the input's name without folder and suffix) in it. "%%" is a percent sign. OUTPUT "-" is standard output.
 
-Sources: a named file is read as a seekable file, anything else as a pipe. A pipe is first read to its end into
-memory, then decoded front to back. The decoder takes the rows of a pipe from right behind the headers, whatever the
-header says, and writes those of a top-down BMP upwards: use --source memory for such files.
+Sources: a PNG is decoded from memory. A BMP is read as a seekable file when it is a named one, as a pipe otherwise. A
+pipe is first read to its end into memory, then decoded front to back. The decoder takes the rows of a BMP pipe from
+right behind the headers, whatever the header says, and writes those of a top-down BMP upwards: use --source memory
+for such files. From file or pipe some PNGs cannot be decoded (a chunk begins across the decoder's buffer).
+
+Modes (PNG): oneshot decodes in one call, iter block by block, line=N by calls for N rows each; the picture is the
+same. iter turns to oneshot when the first block brings no row, and to line=16 for grey of 8 bits that is reduced.
 
 Placement: fit reduces the image to the box (it never enlarges), keeps its shape and centres it. stretch fills the
 box. exact reduces as fit does; the output is just the image. With exact and a quarter turn the decoder does not
-swap width and height of the output, and what lies outside is cut off.
+swap width and height of the output, and what lies outside is cut off. A PNG is turned only when it is reduced or
+stretched, and never when it is grey of 8 bits; reduced, that kind fills only a part of its place. In rgb565 a turn by
+270 degrees shifts a PNG that is not square. The decoder does so; the tool warns of the first two.
 
 Background: what the image does not cover is black and, in formats with alpha, transparent; with --background it is
-opaque in that colour.
+opaque in that colour. In rgb565 and rgb, which have no alpha, a PNG with transparency lies over it.
 
 Formats: bgr565, bgr and bgrx exist for GIF only. A BMP that is reduced or stretched has red and blue exchanged in
 rgb565a: the decoder writes it so.
 
-Exit status: 0 done; 1 failed, no output; 2 done, but the file ends before its pixels do. With several inputs the
+Exit status: 0 done; 1 failed, no output; 2 done, but pixels are missing. With several inputs the
 worst: 1, then 2, then 0.)";
 
 CLI::ValidationError mistake(const std::string &option, const std::string &value, const char *expected) {
@@ -105,6 +111,17 @@ const PixelFormat *parse_format(const std::string &text) {
     return format;
 }
 
+Mode parse_mode(const std::string &text) {
+    if (text == "oneshot") return {Calls::one_shot};
+    if (text == "iter") return {Calls::iterative};
+    constexpr std::string_view by_lines = "line=";
+    if (text.starts_with(by_lines)) {
+        const auto lines = to_number<int32_t>(std::string_view(text).substr(by_lines.size()));
+        if (lines && *lines > 0) return {Calls::by_lines, *lines};
+    }
+    throw mistake("--mode", text, "oneshot, iter or line=N with N above 0");
+}
+
 // An option that takes one of the names in `values`.
 template <class Value>
 void add_choice(CLI::App &app, const std::string &name, Value &target, std::map<std::string, Value> values,
@@ -145,6 +162,8 @@ void add_run_options(CLI::App &app, Options &options) {
         app, "--source", options.source,
         {{"memory", SourceChoice::memory}, {"file", SourceChoice::file}, {"pipe", SourceChoice::pipe}},
         "memory|file|pipe", "How the decoder reads the input");
+    add_parsed(app, "--mode", options.mode, parse_mode, "oneshot|iter|line=N",
+               "How many calls decode the image; default: oneshot");
     add_parsed(app, "--max-memory", options.max_memory, parse_bytes, "BYTES[k|M]",
                "Most memory that the decoder may take, not counting the output");
     add_parsed(app, "--deadline", options.deadline, parse_milliseconds, "MS",

@@ -16,6 +16,13 @@ struct Box {
     int32_t height;
 };
 
+enum class Calls { one_shot, iterative, by_lines };
+
+struct Mode {
+    Calls calls = Calls::one_shot;
+    int32_t lines = 0; // per call, of by_lines
+};
+
 enum class OutputType { png, ppm, pam, raw };
 
 struct Options {
@@ -26,6 +33,7 @@ struct Options {
     std::optional<Box> box; // measured in the output; none: the image's own size
     uint32_t rotation = 0;  // PELM_ROTATE_
     uint32_t placement = 0; // PELM_PLACE_
+    Mode mode;
     SourceChoice source = SourceChoice::automatic;
     std::optional<uint32_t> background; // 0xRRGGBB
     uint64_t max_memory = 0;            // bytes; 0: no limit

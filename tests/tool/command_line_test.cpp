@@ -14,8 +14,8 @@ TEST_F(ToolCommandLine, help_goes_to_standard_output) {
         EXPECT_EQ(got.status, 0);
         EXPECT_EQ(got.err, "");
         for (const char *const word : {"Usage: pelm-decode", "--box", "--place", "--rotate", "--format", "--source",
-                                       "--background", "--info", "--max-memory", "--deadline", "--stats", "--quiet",
-                                       "--output-type", "--version", "%n", "%f", "Exit status"}) {
+                                       "--mode", "--background", "--info", "--max-memory", "--deadline", "--stats",
+                                       "--quiet", "--output-type", "--version", "%n", "%f", "Exit status"}) {
             EXPECT_NE(got.out.find(word), std::string::npos) << word;
         }
     }
@@ -53,6 +53,10 @@ TEST_F(ToolCommandLine, mistakes_are_told_in_one_line) {
         {in, "-o", out, "--rotate", "45"},
         {in, "-o", out, "--format", "cmyk"},
         {in, "-o", out, "--source", "tape"},
+        {in, "-o", out, "--mode", "twice"},
+        {in, "-o", out, "--mode", "line"},
+        {in, "-o", out, "--mode", "line=0"},
+        {in, "-o", out, "--mode", "line=x"},
         {in, "-o", out, "--background", "red"},
         {in, "-o", out, "--background", "12345"},
         {in, "-o", out, "--max-memory", "lots"},

@@ -21,6 +21,8 @@ struct Image {
 
 // Empty images for what cannot be read.
 Image read_png(const std::filesystem::path &path);
+// The stored samples as they are, without colour management: 16 bits cut to the first byte.
+Image read_png_samples(const std::filesystem::path &path);
 Image read_ppm(const Bytes &file);
 Image read_pam(const Bytes &file);
 

@@ -49,13 +49,18 @@ fs::path sample(const std::string &name) {
     return fs::path(PELM_SAMPLES) / name;
 }
 
-std::vector<fs::path> all_samples() {
-    std::vector<fs::path> samples;
-    for (const auto &entry : fs::directory_iterator(PELM_SAMPLES)) {
-        if (entry.path().extension() == ".bmp") samples.push_back(entry.path());
+std::vector<fs::path> files_with_suffix(const fs::path &folder, const std::string &suffix) {
+    std::vector<fs::path> paths;
+    std::error_code missing;
+    for (const auto &entry : fs::directory_iterator(folder, missing)) {
+        if (entry.path().extension() == suffix) paths.push_back(entry.path());
     }
-    std::sort(samples.begin(), samples.end());
-    return samples;
+    std::sort(paths.begin(), paths.end());
+    return paths;
+}
+
+std::vector<fs::path> bmp_samples() {
+    return files_with_suffix(PELM_SAMPLES, ".bmp");
 }
 
 ToolTest::ToolTest() {

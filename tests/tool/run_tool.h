@@ -21,7 +21,8 @@ struct ToolRun {
 Bytes read_file(const std::filesystem::path &path); // empty when there is none
 void write_file(const std::filesystem::path &path, const Bytes &bytes);
 std::filesystem::path sample(const std::string &name);
-std::vector<std::filesystem::path> all_samples();
+std::vector<std::filesystem::path> files_with_suffix(const std::filesystem::path &folder, const std::string &suffix);
+std::vector<std::filesystem::path> bmp_samples();
 
 class ToolTest : public testing::Test {
 protected:
