@@ -187,7 +187,6 @@ uint32_t parse_chunk(PngDecodeState &state, PngInputBuffer &input, uint32_t &len
 
 uint32_t __PELMI_PngParserMain(PngDecodeState *state, PngInputBuffer *input) {
     using namespace pelm;
-    have_bytes(*input, 1);
     state->idatCount = 0;
     state->idatIndexed = 0;
     state->ancillaryFlags = 0;

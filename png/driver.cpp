@@ -121,7 +121,8 @@ uint32_t drive_png(ImageDecodeInfo &info, void *output, int32_t boxWidth, int32_
         return PNG_BAD_LINE_REQUEST;
     }
     use_output(state, output, boxWidth, boxHeight);
-    if (rows > 0) state.stopRow = state.rowsDone + static_cast<uint32_t>(rows);
+    // A negative number lies behind the rows done, or far ahead of the last one: nothing stops there.
+    if (rows != 0) state.stopRow = state.rowsDone + static_cast<uint32_t>(rows);
     state.firstRowOfCall = state.rowsDone;
     state.bandBase = style == CallStyle::line ? state.firstRowOfCall : 0;
     const uint32_t code = run_loop(info, state);

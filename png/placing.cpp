@@ -107,7 +107,7 @@ OutputSteps output_steps(const PngDecodeState &state) {
 
 void use_output(PngDecodeState &state, void *output, int32_t boxWidth, int32_t boxHeight) {
     state.output = {static_cast<uint8_t *>(output), 0};
-    if (output == nullptr || !positions_fit(state)) return;
+    if (output == nullptr || boxWidth < 0 || boxHeight < 0 || !positions_fit(state)) return;
     const bool exact = state.exactPlacement != 0;
     size_t bytes = 0;
     if (buffer_bytes(exact ? static_cast<int32_t>(state.scaledWidth) : boxWidth,

@@ -191,7 +191,6 @@ std::string why_data_is_refused(const PngFacts &facts) {
 std::string why_image_is_refused(const PngFacts &facts) {
     if (!facts.has_header) return "there is no IHDR chunk";
     if (facts.data_chunks == 0) return "there is no image data";
-    if (facts.interlace != 0) return "interlaced: not decoded yet";
     const std::string why = why_size_is_refused(facts);
     return why.empty() ? why_data_is_refused(facts) : why;
 }
