@@ -60,8 +60,17 @@ struct Decoding {
     Box box;
 };
 
-uint32_t flags_of(const Options &options) {
-    return options.rotation | options.placement;
+bool keeps_its_size(const Decoding &decoding) {
+    return pelm_tool::keeps_its_size(decoding.description, decoding.box,
+                                     decoding.options.rotation | decoding.options.placement);
+}
+
+// A reduced interlaced image looks better through the frame buffer.
+uint32_t flags_of(const Decoding &decoding) {
+    const uint32_t flags = decoding.options.rotation | decoding.options.placement;
+    const bool framed =
+        decoding.options.frame_buffer || (decoding.description.is_interlaced && !keeps_its_size(decoding));
+    return framed ? flags | PELM_INTERLACE_FRAME : flags;
 }
 
 std::string memory_failure(const Options &options) {
@@ -70,7 +79,7 @@ std::string memory_failure(const Options &options) {
 }
 
 std::string rows_of_all(const Decoding &decoding, int64_t rows) {
-    return std::to_string(rows) + " of " + std::to_string(decoding.description.height) + " rows";
+    return std::to_string(rows) + " of " + std::to_string(decoding.description.stored_rows) + " rows";
 }
 
 // Whether the decoder takes the same bytes from memory.
@@ -115,7 +124,7 @@ RunResult run(const Decoding &decoding, Picture *picture) {
     ImageDecodeInfo info = {};
     info.input = decoding.input.source();
     info.outputFormat = decoding.options.format->code;
-    info.flags = flags_of(decoding.options);
+    info.flags = flags_of(decoding);
     DecodeJob job{info, decoding.description, decoding.box, decoding.options.mode, picture, decoding.session.polls()};
     const int32_t result = decoding.image.decode(job);
     throw_if_failed(decoding, job, result);
@@ -127,7 +136,7 @@ RunResult run(const Decoding &decoding, Picture *picture) {
 }
 
 std::string shortage_after(const Decoding &decoding, const RunResult &result) {
-    const bool is_whole = !decoding.image.polls_rows || result.complete_rows >= decoding.description.height;
+    const bool is_whole = !decoding.image.polls_rows || result.complete_rows >= decoding.description.stored_rows;
     if (is_whole) return decoding.description.shortage;
     return "the image data breaks off after " + rows_of_all(decoding, result.complete_rows);
 }
@@ -144,7 +153,7 @@ Picture blank_picture_for(const Decoding &decoding) {
 std::vector<std::string> notes_on(const Decoding &decoding) {
     std::vector<std::string> notes = decoding.description.notes;
     if (!decoding.image.turns_only_reduced) return notes;
-    const bool keeps_size = keeps_its_size(decoding.description, decoding.box, flags_of(decoding.options));
+    const bool keeps_size = keeps_its_size(decoding);
     const bool is_grey_8 = decoding.description.is_grey_8;
     if (decoding.options.rotation != PELM_ROTATE_0 && (keeps_size || is_grey_8))
         notes.push_back(std::string("the decoder does not turn a PNG ") +
@@ -200,6 +209,8 @@ Decoded decode(Input &input, const ImageFormat &image, const ImageDescription &d
     if (!writes(image, *options.format)) {
         throw Failure(std::string("the ") + image.name + " decoder does not write the format " + options.format->name);
     }
+    if (description.is_interlaced && options.mode.calls == Calls::by_lines)
+        throw Failure("an interlaced image cannot be decoded by lines");
     if (options.mode.calls != Calls::one_shot && !image.decodes_in_calls) {
         throw Failure(std::string("the ") + image.name + " decoder has only --mode oneshot so far");
     }

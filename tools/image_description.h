@@ -14,7 +14,9 @@ constexpr size_t described_bytes = 66;
 struct ImageDescription {
     int32_t width = 0; // as decoded; 0 when the image is refused before it is known
     int32_t height = 0;
-    bool is_grey_8 = false;         // PNG: grey of 8 bits, which is reduced by rules of its own
+    int32_t stored_rows = 0;        // PNG: rows of the image data; of all passes together when it is interlaced
+    bool is_interlaced = false;     // PNG
+    bool is_grey_8 = false;         // PNG: grey of 8 bits in plain rows, which is reduced by rules of its own
     std::string words;              // size, depth and variant
     std::string refusal;            // why the decoder refuses it; empty when it does not
     std::string shortage;           // what a truncated file lacks; empty when it is whole

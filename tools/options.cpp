@@ -26,6 +26,8 @@ for such files. From file or pipe some PNGs cannot be decoded (a chunk begins ac
 
 Modes (PNG): oneshot decodes in one call, iter block by block, line=N by calls for N rows each; the picture is the
 same. iter turns to oneshot when the first block brings no row, and to line=16 for grey of 8 bits that is reduced.
+An interlaced PNG cannot be decoded by lines; reduced, it goes through the frame buffer, where in rgb565 and rgb only
+transparency by tRNS lets the background through.
 
 Placement: fit reduces the image to the box (it never enlarges), keeps its shape and centres it. stretch fills the
 box. exact reduces as fit does; the output is just the image. With exact and a quarter turn the decoder does not
@@ -164,6 +166,8 @@ void add_run_options(CLI::App &app, Options &options) {
         "memory|file|pipe", "How the decoder reads the input");
     add_parsed(app, "--mode", options.mode, parse_mode, "oneshot|iter|line=N",
                "How many calls decode the image; default: oneshot");
+    app.add_flag("--frame-buffer", options.frame_buffer,
+                 "Write an interlaced PNG from a frame buffer; always done where it is reduced");
     add_parsed(app, "--max-memory", options.max_memory, parse_bytes, "BYTES[k|M]",
                "Most memory that the decoder may take, not counting the output");
     add_parsed(app, "--deadline", options.deadline, parse_milliseconds, "MS",

@@ -38,6 +38,7 @@ struct Options {
     std::optional<uint32_t> background; // 0xRRGGBB
     uint64_t max_memory = 0;            // bytes; 0: no limit
     uint32_t deadline = 0;              // milliseconds per input; 0: none
+    bool frame_buffer = false;          // PNG: interlaced images through a whole-frame buffer
     bool info = false;
     bool stats = false;
     bool quiet = false;

@@ -22,7 +22,7 @@ int64_t polls_since(const DecodeJob &job, uint64_t before) {
 // How many output rows of a reduced image are finished with that many of its own rows: the second of the two lines of
 // samples that an output row is made of lies three quarters of its height down.
 int64_t output_rows_after(const DecodeJob &job, int64_t image_rows) {
-    if (keeps_its_size(job)) return image_rows;
+    if (keeps_its_size(job) || job.image.is_interlaced) return image_rows; // each row of a pass counts
     const int64_t image_height = job.image.height;
     const int64_t sampled = image_rows * job.info.outputHeight - 3 * image_height / 4;
     if (sampled <= 0) return 0;

@@ -195,6 +195,19 @@ std::string why_image_is_refused(const PngFacts &facts) {
     return why.empty() ? why_data_is_refused(facts) : why;
 }
 
+// A pass has rows only where it has columns too.
+int32_t rows_of_passes(const PngFacts &facts) {
+    constexpr struct {
+        uint32_t x_start, y_start, x_step, y_step;
+    } passes[] = {{0, 0, 8, 8}, {4, 0, 8, 8}, {0, 4, 4, 8}, {2, 0, 4, 4}, {0, 2, 2, 4}, {1, 0, 2, 2}, {0, 1, 1, 2}};
+    uint32_t rows = 0;
+    for (const auto &pass : passes) {
+        if (facts.width > pass.x_start && facts.height > pass.y_start)
+            rows += (facts.height - pass.y_start - 1) / pass.y_step + 1;
+    }
+    return static_cast<int32_t>(rows);
+}
+
 std::vector<std::string> notes_on(const PngFacts &facts, const InputSource &source) {
     std::vector<std::string> notes;
     if (facts.last_type != "IEND")
@@ -223,7 +236,9 @@ ImageDescription describe_png(InputSource &source) {
     if (!description.refusal.empty()) return description;
     description.width = static_cast<int32_t>(facts.width);
     description.height = static_cast<int32_t>(facts.height);
-    description.is_grey_8 = facts.colour_type == grey && facts.depth == 8;
+    description.is_interlaced = facts.interlace != 0;
+    description.stored_rows = description.is_interlaced ? rows_of_passes(facts) : description.height;
+    description.is_grey_8 = facts.colour_type == grey && facts.depth == 8 && !description.is_interlaced;
     description.notes = notes_on(facts, source);
     return description;
 }

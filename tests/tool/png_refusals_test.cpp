@@ -75,7 +75,6 @@ TEST_F(ToolPngRefusals, headers) {
                  {{4, 4, 8, 2, 1}, "compression method 1 does not exist"},
                  {{4, 4, 8, 2, 0, 1}, "filter method 1 does not exist"},
                  {{4, 4, 8, 2, 0, 0, 2}, "interlace method 2 does not exist"},
-                 {{4, 4, 8, 2, 0, 0, 1}, "interlaced: not decoded yet"},
                  {{4, 4, 8, 5}, "colour type 5 does not exist"},
                  {{4, 4, 8, 7}, "colour type 7 does not exist"},
                  {{4, 4, 4, 2}, "RGB of 4 bits per sample does not exist"},
