@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "frame/bytes.h"
+#include "frame/memory.h"
 
 namespace pelm {
 namespace {
@@ -25,7 +26,7 @@ SetUp read_palette(BmpState &state, const BmpHeader &header, InputSource &input)
     const int32_t bytes = palette_bytes(header.pixel_data_offset);
     if (bytes < 0) return SetUp::refused;
     const auto block = static_cast<uint32_t>(std::max(bytes, smallest_palette));
-    state.palette = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(block));
+    state.palette = allocate_array<uint8_t>(block);
     if (state.palette == nullptr) return SetUp::refused;
     ZOTARPELM_OsMemset(state.palette, 0, block);
     if (bytes == 0) return SetUp::done;

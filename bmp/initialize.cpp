@@ -8,6 +8,7 @@
 #include "bmp/scaling.h"
 #include "bmp/working.h"
 #include "frame/formats.h"
+#include "frame/memory.h"
 #include "frame/sizes.h"
 
 namespace pelm {
@@ -60,18 +61,17 @@ bool allocate_staging(BmpState &state, InputSource &input) {
     if (input.kind != PELM_SOURCE_STREAM && input.kind != PELM_SOURCE_STREAM_ALT) return true;
     const int32_t stride = row_stride(state.width, state.bitsPerPixel);
     input.bufferSize = input.bufferSize < stride ? stride : input.bufferSize / stride * stride;
-    input.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(input.bufferSize)));
+    input.data = allocate_array<uint8_t>(static_cast<uint32_t>(input.bufferSize));
     return input.data != nullptr;
 }
 
 // Two rows by contract, although the scan of frame/sampling.h's sample lines never has more than one open.
 bool allocate_accumulators(BmpState &state) {
     if (state.scaledWidth <= 0) return true;
-    const int64_t bytes = int64_t{state.scaledWidth} * 8;
-    if (bytes > std::numeric_limits<uint32_t>::max()) return false;
-    state.accumulators = static_cast<uint32_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(bytes)));
+    const uint64_t words = 2 * static_cast<uint64_t>(state.scaledWidth);
+    state.accumulators = allocate_array<uint32_t>(words);
     if (state.accumulators == nullptr) return false;
-    ZOTARPELM_OsMemset(state.accumulators, 0, static_cast<uint32_t>(bytes));
+    ZOTARPELM_OsMemset(state.accumulators, 0, static_cast<uint32_t>(4 * words));
     return true;
 }
 
@@ -101,9 +101,8 @@ SetUp set_up(BmpState &state, ImageDecodeInfo &info, Size box, void *output) {
 
 BmpState *PELMI_BMP_Initialize(ImageDecodeInfo *info, int32_t outWidth, int32_t outHeight, void *output) {
     if (info == nullptr || info->input == nullptr) return nullptr;
-    auto *const state = static_cast<BmpState *>(ZOTARPELM_OsMalloc(sizeof(BmpState)));
+    auto *const state = pelm::new_record<BmpState>();
     if (state == nullptr) return nullptr;
-    ZOTARPELM_OsMemset(state, 0, sizeof(BmpState));
 
     switch (pelm::set_up(*state, *info, {outWidth, outHeight}, output)) {
     case pelm::SetUp::done: break;
@@ -121,19 +120,17 @@ void PELMI_BMP_DeleteDecInfo(BmpState *state) {
     InputSource *const input = state->input;
     const bool staged =
         input != nullptr && (input->kind == PELM_SOURCE_STREAM || input->kind == PELM_SOURCE_STREAM_ALT);
-    if (staged && input->data != nullptr) ZOTARPELM_OsFree(input->data);
-    if (staged) input->data = nullptr;
-    if (state->palette != nullptr) ZOTARPELM_OsFree(state->palette);
-    if (state->accumulators != nullptr) ZOTARPELM_OsFree(state->accumulators);
-    ZOTARPELM_OsFree(state);
+    if (staged) pelm::free_block(input->data);
+    pelm::free_block(state->palette);
+    pelm::free_block(state->accumulators);
+    pelm::free_block(state);
 }
 
 int32_t PELMI_BMP_DestroyBMP(ImageDecodeInfo *info) {
     if (info == nullptr) return 0;
     auto *const state = static_cast<BmpState *>(info->decoderState);
     if (state == nullptr) return 1;
-    if (state->palette != nullptr) ZOTARPELM_OsFree(state->palette);
-    ZOTARPELM_OsFree(state);
-    info->decoderState = nullptr;
+    pelm::free_block(state->palette);
+    pelm::free_block(info->decoderState);
     return 1;
 }

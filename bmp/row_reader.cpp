@@ -4,7 +4,7 @@
 #include <limits>
 
 #include "bmp/header.h"
-#include "frame/host.h"
+#include "frame/memory.h"
 
 namespace pelm {
 namespace {
@@ -76,7 +76,7 @@ bool open_sequential(RowReader &reader, const BmpState &state) {
     // The first rows of a top-down image may hold no sample, but they are what the stream delivers first.
     if (state.topDown != 0 && state.rowsDone == 0) reader.current = -1;
     reader.capacity = std::max(reader.input->bufferSize, reader.stride);
-    reader.buffer = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(reader.capacity)));
+    reader.buffer = allocate_array<uint8_t>(static_cast<uint32_t>(reader.capacity));
     reader.owns_buffer = true;
     return reader.buffer != nullptr;
 }
@@ -102,7 +102,7 @@ const uint8_t *read_row(RowReader &reader, int32_t index) {
 }
 
 void close_rows(RowReader &reader) {
-    if (reader.owns_buffer && reader.buffer != nullptr) ZOTARPELM_OsFree(reader.buffer);
+    if (reader.owns_buffer) free_block(reader.buffer);
 }
 
 } // namespace pelm

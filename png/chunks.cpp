@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "frame/host.h"
+#include "frame/memory.h"
 #include "png/crc32.h"
 #include "png/idat_index.h"
 
@@ -96,19 +96,14 @@ uint32_t read_ihdr(PngDecodeState &state, PngInputBuffer &input, uint32_t length
     return PNG_DONE;
 }
 
-void free_block(void *block) {
-    if (block != nullptr) ZOTARPELM_OsFree(block);
-}
-
 // A second palette takes the place of the first.
 bool allocate_palette(PngDecodeState &state, uint32_t length) {
     free_block(state.palette);
     free_block(state.paletteAlpha);
-    state.paletteAlpha = nullptr;
     const uint32_t alpha_block = std::max(length * 2, 2u);
-    state.palette = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(palette_block));
+    state.palette = allocate_array<uint8_t>(palette_block);
     if (state.palette == nullptr) return false;
-    state.paletteAlpha = static_cast<uint16_t *>(ZOTARPELM_OsMalloc(alpha_block));
+    state.paletteAlpha = static_cast<uint16_t *>(allocate(alpha_block));
     if (state.paletteAlpha == nullptr) return false;
     ZOTARPELM_OsMemset(state.palette, 0, palette_block);
     ZOTARPELM_OsMemset(state.paletteAlpha, 0xFF, alpha_block);

@@ -1,10 +1,8 @@
 // The driver that the public calls share: sets a decode up on its first call, goes on with it on later ones.
-#include <limits>
-
-#include "frame/host.h"
+#include "png/driver.h"
+#include "frame/memory.h"
 #include "frame/placement.h"
 #include "png/chunks.h"
-#include "png/driver.h"
 #include "png/entry.h"
 #include "png/image_data.h"
 #include "png/placing.h"
@@ -12,35 +10,16 @@
 namespace pelm {
 namespace {
 
-template <class Record>
-Record *new_record() {
-    auto *const record = static_cast<Record *>(ZOTARPELM_OsMalloc(sizeof(Record)));
-    if (record != nullptr) ZOTARPELM_OsMemset(record, 0, sizeof(Record));
-    return record;
-}
-
-template <class Block>
-void free_block(Block *&block) {
-    if (block != nullptr) ZOTARPELM_OsFree(block);
-    block = nullptr;
-}
-
 bool make_reader(PngDecodeState &state, InputSource &source) {
     state.input = new_record<PngInputBuffer>();
     state.readsMemory = source.kind == PELM_SOURCE_MEMORY ? 1 : 0;
     return state.input != nullptr && open_reader(*state.input, source);
 }
 
-uint32_t *new_words(uint64_t count) {
-    const uint64_t bytes = count * 4;
-    if (bytes > std::numeric_limits<uint32_t>::max()) return nullptr;
-    return static_cast<uint32_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(bytes)));
-}
-
 // Not checked: without them nothing is written, and the result stays.
 void allocate_accumulators(PngDecodeState &state) {
-    state.resizeRowAccum = new_words(state.imageWidth);
-    state.resizeOutAccum = new_words(state.scaledWidth);
+    state.resizeRowAccum = allocate_array<uint32_t>(state.imageWidth);
+    state.resizeOutAccum = allocate_array<uint32_t>(state.scaledWidth);
     if (state.resizeOutAccum != nullptr) ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
 }
 
@@ -73,7 +52,8 @@ uint32_t set_up(ImageDecodeInfo &info, int32_t boxWidth, int32_t boxHeight) {
     state->outputFormat = info.outputFormat;
     place_png(*state, info.flags, boxWidth, boxHeight);
     if (interlaced && (info.flags & PELM_INTERLACE_MASK) == PELM_INTERLACE_FRAME) {
-        state->interlaceFrame = new_words(uint64_t{state->scaledWidth} * state->scaledHeight); // not checked either
+        state->interlaceFrame =
+            allocate_array<uint32_t>(uint64_t{state->scaledWidth} * state->scaledHeight); // not checked either
         state->interlaceFrameUsed = 1;
     }
     return PNG_ROWS_REMAIN;

@@ -9,54 +9,41 @@
 namespace pelm {
 namespace {
 
-// Carries its alpha where the format has one, and hides what is there where it has none.
+// Carries its alpha where the format has one. Where it has none, it hides what is there, or blends over it.
+template <bool blends>
 struct FramePixel {
     Rgba c;
 };
 
-constexpr Rgb channels_of(FramePixel pixel) {
+template <bool blends>
+constexpr Rgb channels_of(FramePixel<blends> pixel) {
     return channels_of(pixel.c);
 }
 
-constexpr uint8_t alpha_of(FramePixel pixel) {
+template <bool blends>
+constexpr uint8_t alpha_of(FramePixel<blends> pixel) {
     return pixel.c.a;
 }
 
-constexpr uint16_t rgb565_of(FramePixel pixel) {
+template <bool blends>
+constexpr uint16_t rgb565_of(FramePixel<blends> pixel) {
     return rgb565_of(pixel.c);
 }
 
-// The same, blended where the format has no alpha.
 // Required: the weights sum to 255, so that a pixel of alpha 255 comes out a little darker (docs/oddities.md, "The
 // frame buffer").
-struct BlendedFramePixel {
-    Rgba c;
-};
-
 constexpr uint8_t frame_blend(uint32_t over, uint32_t alpha, uint32_t under) {
     return static_cast<uint8_t>(((under * (255 - alpha)) >> 8) + ((over * alpha) >> 8));
 }
 
-constexpr Rgb channels_of(BlendedFramePixel pixel) {
-    return channels_of(pixel.c);
-}
-
-constexpr uint8_t alpha_of(BlendedFramePixel pixel) {
-    return pixel.c.a;
-}
-
-constexpr uint16_t rgb565_of(BlendedFramePixel pixel) {
-    return rgb565_of(pixel.c);
-}
-
-inline void put_rgb565(uint8_t *at, BlendedFramePixel pixel) {
+inline void put_rgb565(uint8_t *at, FramePixel<true> pixel) {
     const Rgb under = widened_rgb565(load_u16(at));
     const Rgba over = pixel.c;
     store_u16(at, rgb565_of(Rgb{frame_blend(over.r, over.a, under.r), frame_blend(over.g, over.a, under.g),
                                 frame_blend(over.b, over.a, under.b)}));
 }
 
-inline void put_rgb888(uint8_t *at, BlendedFramePixel pixel) {
+inline void put_rgb888(uint8_t *at, FramePixel<true> pixel) {
     const Rgba over = pixel.c;
     at[0] = frame_blend(over.r, over.a, at[0]);
     at[1] = frame_blend(over.g, over.a, at[1]);
@@ -106,7 +93,7 @@ void divide_frame_by_alpha(const PngDecodeState &state) {
 void __PELMI_WriteOutputDataFromINTBuffer(PngDecodeState *state) {
     if (state->interlaceFrame == nullptr || state->output.size == 0) return;
     if ((state->ancillaryFlags & PNG_HAS_TRNS) != 0)
-        pelm::write_frame<pelm::BlendedFramePixel>(*state);
+        pelm::write_frame<pelm::FramePixel<true>>(*state);
     else
-        pelm::write_frame<pelm::FramePixel>(*state);
+        pelm::write_frame<pelm::FramePixel<false>>(*state);
 }

@@ -1,18 +1,12 @@
 #include "png/idat_index.h"
 
-#include <limits>
-
-#include "frame/host.h"
+#include "frame/memory.h"
 
 namespace pelm {
 namespace {
 
-void *allocate(uint64_t bytes) {
-    return bytes > std::numeric_limits<uint32_t>::max() ? nullptr : ZOTARPELM_OsMalloc(static_cast<uint32_t>(bytes));
-}
-
 bool start_table(PngDecodeState &state) {
-    state.idatTable = static_cast<PngIdatEntry *>(allocate(uint64_t{IDAT_TABLE_STEP} * sizeof(PngIdatEntry)));
+    state.idatTable = allocate_array<PngIdatEntry>(IDAT_TABLE_STEP);
     if (state.idatTable == nullptr) return false;
     state.idatCapacity = IDAT_TABLE_STEP;
     return true;

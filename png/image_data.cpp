@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "frame/host.h"
+#include "frame/memory.h"
 #include "png/entry.h"
 #include "png/idat_input.h"
 #include "png/inflate/inflate.h"
@@ -45,11 +45,9 @@ bool resumes(const Adam7Rows &rows) {
 template <class Kind>
 bool allocate_stream_memory(Kind &rows) {
     PngDecodeState &state = *rows.state;
-    if (state.fixedHuffmanPool == nullptr)
-        state.fixedHuffmanPool = static_cast<HuffmanNodePool *>(ZOTARPELM_OsMalloc(sizeof(HuffmanNodePool)));
+    if (state.fixedHuffmanPool == nullptr) state.fixedHuffmanPool = allocate_array<HuffmanNodePool>(1);
     if (state.fixedHuffmanPool == nullptr || !allocate_rows(rows)) return false;
-    if (state.inflate.window.bytes == nullptr)
-        state.inflate.window.bytes = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(window_size));
+    if (state.inflate.window.bytes == nullptr) state.inflate.window.bytes = allocate_array<uint8_t>(window_size);
     return state.inflate.window.bytes != nullptr;
 }
 

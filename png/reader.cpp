@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <limits>
 
-#include "frame/host.h"
+#include "frame/memory.h"
 
 namespace pelm {
 namespace {
@@ -55,7 +55,7 @@ bool open_reader(PngInputBuffer &input, InputSource &source) {
         input.bytesLeft = input.sourceSize;
         return true;
     }
-    input.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(PNG_READ_BUFFER_SIZE));
+    input.data = allocate_array<uint8_t>(PNG_READ_BUFFER_SIZE);
     if (input.data == nullptr) return false;
     ZOTARPELM_Seek_IO(&source, 0, 0);
     return true;

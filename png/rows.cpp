@@ -1,9 +1,8 @@
 #include "png/rows.h"
 
-#include <limits>
 #include <utility>
 
-#include "frame/host.h"
+#include "frame/memory.h"
 #include "png/adam7.h"
 #include "png/frame_buffer.h"
 #include "png/pixels.h"
@@ -16,11 +15,8 @@ namespace {
 // The row buffers fit a row of the whole image.
 bool allocate_row_buffers(PngDecodeState &state) {
     const uint64_t row = (uint64_t{state.wholeWidth} * state.bitsPerPixel + 7) / 8 + 1;
-    const uint64_t bytes = 2 * (row + state.wholeWidth);
-    if (bytes > std::numeric_limits<uint32_t>::max()) return false;
-    state.rowLength = static_cast<uint32_t>(row);
-    if (state.rowBuffers == nullptr)
-        state.rowBuffers = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(bytes)));
+    state.rowLength = static_cast<uint32_t>(row); // wraps only where there is no memory for it
+    if (state.rowBuffers == nullptr) state.rowBuffers = allocate_array<uint8_t>(2 * (row + state.wholeWidth));
     return state.rowBuffers != nullptr;
 }
 
@@ -70,10 +66,10 @@ bool allocate_rows(PlainRows &rows) {
 
 bool allocate_rows(Adam7Rows &rows) {
     PngDecodeState &state = *rows.state;
-    const uint64_t zeros = uint64_t{state.wholeWidth} * 8; // a pixel has no more bytes than that
-    if (!allocate_row_buffers(state) || zeros > std::numeric_limits<uint32_t>::max()) return false;
+    if (!allocate_row_buffers(state)) return false;
     if (state.zeroRow != nullptr) return true;
-    state.zeroRow = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(zeros)));
+    const uint64_t zeros = uint64_t{state.wholeWidth} * 8; // a pixel has no more bytes than that
+    state.zeroRow = allocate_array<uint8_t>(zeros);
     if (state.zeroRow != nullptr) ZOTARPELM_OsMemset(state.zeroRow, 0, static_cast<uint32_t>(zeros));
     return state.zeroRow != nullptr;
 }

@@ -1,7 +1,7 @@
 // The code lengths at the head of a dynamic block.
 #pragma once
 
-#include "frame/host.h"
+#include "frame/memory.h"
 #include "png/inflate/state.h"
 
 namespace pelm {
@@ -52,7 +52,7 @@ Stop take_code_lengths(InflateState &state, Input &input, const HuffmanNode *nod
 template <class Input>
 Stop read_dynamic_header(InflateState &state, Input &input, HuffmanNodePool *&pool) {
     constexpr uint8_t order[19] = {16, 17, 18, 0, 8, 7, 9, 6, 10, 5, 11, 4, 12, 3, 13, 2, 14, 1, 15};
-    if (pool == nullptr) pool = static_cast<HuffmanNodePool *>(ZOTARPELM_OsMalloc(sizeof(HuffmanNodePool)));
+    if (pool == nullptr) pool = allocate_array<HuffmanNodePool>(1);
     if (pool == nullptr) return Stop::no_memory;
 
     uint32_t counts = 0;

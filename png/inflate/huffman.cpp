@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <bit>
 
-#include "frame/host.h"
+#include "frame/memory.h"
 #include "png/inflate/alphabets.h"
 
 namespace {
@@ -104,7 +104,5 @@ HuffmanNode *__PELMI_PngBuildHuffmanTable(const uint8_t *codeLengths, uint32_t c
 }
 
 void PELMI_FreePNGHuffmanMemory(HuffmanNodePool **pool) {
-    if (pool == nullptr || *pool == nullptr) return;
-    ZOTARPELM_OsFree(*pool);
-    *pool = nullptr;
+    if (pool != nullptr) free_block(*pool);
 }

@@ -1,5 +1,5 @@
 // A block's trees and the lookup tables in front of them.
-#include "frame/host.h"
+#include "frame/memory.h"
 #include "png/inflate/fixed_codes.h"
 #include "png/inflate/state.h"
 
@@ -12,7 +12,7 @@ uint32_t build(HuffmanNodePool &pool, const uint8_t *code_lengths, uint32_t coun
 
 // The allocation comes with the first compressed block, whatever its codes.
 bool allocate_lookup(InflateState &state) {
-    if (state.lookup == nullptr) state.lookup = static_cast<LookupTables *>(ZOTARPELM_OsMalloc(lookup_allocation));
+    if (state.lookup == nullptr) state.lookup = static_cast<LookupTables *>(allocate(lookup_allocation));
     return state.lookup != nullptr;
 }
 
