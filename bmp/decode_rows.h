@@ -84,6 +84,9 @@ int32_t reduce_rows(const BmpState &state, Band band, RowReader &reader, OutputR
     return PELM_RESULT_DONE;
 }
 
+// Where nothing can be written the rows are only read, as far as the band needs them.
+int32_t pass_over_rows(const BmpState &state, Band band, RowReader &reader);
+
 // Decodes `rows` output rows from `state.rowsDone` on. `load` is the layout; its row is filled in here. Nothing is
 // decoded of a record whose rows are laid out otherwise.
 template <class Load>
@@ -96,8 +99,12 @@ int32_t decode_rows(const BmpState &state, intptr_t cursor, int32_t rows, const 
     int32_t result = PELM_RESULT_FAILED;
     if (open_rows(reader, state, first_file_row(state, band))) {
         const OutputRows to = output_rows(state, cursor, band.count);
-        result =
-            state.oneToOne != 0 ? copy_rows(state, band, reader, to, load) : reduce_rows(state, band, reader, to, load);
+        if (state.output.size == 0)
+            result = pass_over_rows(state, band, reader);
+        else if (state.oneToOne != 0)
+            result = copy_rows(state, band, reader, to, load);
+        else
+            result = reduce_rows(state, band, reader, to, load);
     }
     close_rows(reader);
     return result;

@@ -111,7 +111,7 @@ void finish_image(PlainRows &) {}
 
 void finish_image(Adam7Rows &rows) {
     PngDecodeState &state = *rows.state;
-    if (state.isOneToOne != 0 || state.interlaceFrameUsed == 0) return;
+    if (state.isOneToOne != 0 || state.interlaceFrameUsed == 0 || state.output.size == 0) return;
     state.outputCursor = static_cast<intptr_t>(first_pixel_position(state));
     divide_frame_by_alpha(state);
     __PELMI_WriteOutputDataFromINTBuffer(&state);

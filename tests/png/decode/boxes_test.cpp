@@ -1,0 +1,59 @@
+// Boxes that no buffer can have: their sizes wrap 32 and 64 bits. Without a buffer every call ends at once, whatever
+// the sizes that follow from the box, and nothing is kept.
+#include <cstdint>
+#include <limits>
+
+#include "tests/png/decode/decoding.h"
+
+namespace pelm::test {
+namespace {
+
+constexpr int32_t sides[] = {std::numeric_limits<int32_t>::min(), -65536, -1, 0, 1, 65535, 65536, 1 << 30,
+                             std::numeric_limits<int32_t>::max()};
+constexpr uint32_t placements[] = {PELM_PLACE_FIT, PELM_PLACE_EXACT, PELM_PLACE_STRETCH,
+                                   PELM_PLACE_STRETCH | PELM_INTERLACE_FRAME};
+
+Bytes small_png(uint8_t colour_type, uint8_t interlace) {
+    Png png;
+    png.width = 5;
+    png.height = 7;
+    png.colour_type = colour_type;
+    png.interlace = interlace;
+    return build(png);
+}
+
+int32_t decode_without_buffer(Bytes &file, uint32_t flags, uint32_t format, int32_t width, int32_t height) {
+    InputSource source{};
+    source.kind = PELM_SOURCE_MEMORY;
+    source.data = file.data();
+    source.size = static_cast<int32_t>(file.size());
+    ImageDecodeInfo info{};
+    info.input = &source;
+    info.flags = flags;
+    info.outputFormat = format;
+    const int32_t result = ZOTARPELMI_DecodePNG(&info, nullptr, width, height);
+    EXPECT_EQ(info.decoderState, nullptr);
+    return result;
+}
+
+class PngBoxes : public PngDecoding {};
+
+TEST_F(PngBoxes, that_no_buffer_can_have_end_at_once) {
+    for (const uint8_t colour_type : {uint8_t{0}, uint8_t{2}, uint8_t{6}})
+        for (const uint8_t interlace : {uint8_t{0}, uint8_t{1}}) {
+            const Bytes file = small_png(colour_type, interlace);
+            for (const uint32_t placement : placements)
+                for (const uint32_t rotation : {PELM_ROTATE_0, PELM_ROTATE_90, PELM_ROTATE_270})
+                    for (const int32_t width : sides)
+                        for (const int32_t height : sides) {
+                            Bytes copy = file;
+                            for (const uint32_t format : {PELM_FORMAT_RGB565, PELM_FORMAT_RGBA8888})
+                                EXPECT_EQ(decode_without_buffer(copy, placement | rotation, format, width, height), 1)
+                                    << width << "x" << height << ", flags " << (placement | rotation);
+                        }
+        }
+    EXPECT_TRUE(host.live_blocks().empty());
+}
+
+} // namespace
+} // namespace pelm::test
