@@ -61,14 +61,13 @@ uint64_t frame_words(const PngDecodeState &state) {
 }
 
 template <class Pixel>
-void write_frame(PngDecodeState &state) {
-    const int64_t step = int64_t{state.outputPixelStep} * pixel_step_unit(state.outputFormat);
+void write_frame_as(PngDecodeState &state, const OutputSteps &steps) {
     const uint32_t *words = state.interlaceFrame;
     int64_t position = state.outputCursor;
     for (uint32_t row = 0; row < state.scaledHeight; ++row, words += state.scaledWidth) {
-        write_row_clipped(state.output, position, step, state.outputFormat, FrameRow<Pixel>{words}, 0,
+        write_row_clipped(state.output, position, steps.pixel, state.outputFormat, FrameRow<Pixel>{words}, 0,
                           static_cast<int32_t>(state.scaledWidth));
-        position += state.outputRowStep;
+        position += steps.row;
     }
     state.outputCursor = static_cast<intptr_t>(position);
 }
@@ -88,12 +87,17 @@ void divide_frame_by_alpha(const PngDecodeState &state) {
         state.interlaceFrame[i] = packed(weighted.at(static_cast<size_t>(i)));
 }
 
+void write_frame(PngDecodeState &state, const OutputSteps &steps) {
+    if (state.interlaceFrame == nullptr || state.output.size == 0 || steps.pixel == 0) return;
+    if ((state.ancillaryFlags & PNG_HAS_TRNS) != 0)
+        write_frame_as<FramePixel<true>>(state, steps);
+    else
+        write_frame_as<FramePixel<false>>(state, steps);
+}
+
 } // namespace pelm
 
 void __PELMI_WriteOutputDataFromINTBuffer(PngDecodeState *state) {
-    if (state->interlaceFrame == nullptr || state->output.size == 0) return;
-    if ((state->ancillaryFlags & PNG_HAS_TRNS) != 0)
-        pelm::write_frame<pelm::FramePixel<true>>(*state);
-    else
-        pelm::write_frame<pelm::FramePixel<false>>(*state);
+    pelm::write_frame(
+        *state, {int64_t{state->outputPixelStep} * pelm::pixel_step_unit(state->outputFormat), state->outputRowStep});
 }

@@ -2,7 +2,7 @@
 // from there to the caller's buffer.
 #pragma once
 
-#include "png/state.h"
+#include "png/placing.h"
 
 // Writes the frame through outputCursor and the steps, and leaves the cursor behind the last row. Formats 0 and 1 blend
 // when the image has a tRNS chunk, and only then, with the weights alpha and 255 - alpha.
@@ -13,5 +13,8 @@ namespace pelm {
 // Scaled images only; does nothing without a frame.
 void clear_frame(const PngDecodeState &state);
 void divide_frame_by_alpha(const PngDecodeState &state);
+
+// Writes the frame with steps that may be larger than the record's words hold.
+void write_frame(PngDecodeState &state, const OutputSteps &steps);
 
 } // namespace pelm

@@ -71,17 +71,19 @@ void add_to_frame(const PngDecodeState &state, const PassGrid &grid, uint32_t y,
 
 void write_pass_row(PngDecodeState &state, uint32_t row, int64_t area) {
     const uint32_t pass = state.interlaceMethod;
-    if (pass > pass_count || state.output.size == 0) return;
+    const bool framed = state.isOneToOne == 0 && state.interlaceFrameUsed != 0;
+    // A frame is filled also while nothing can be seen: a later call may show it.
+    if (pass > pass_count || (framed ? state.interlaceFrame == nullptr : state.output.size == 0)) return;
     const PassGrid grid = pass_grid(pass);
     const uint32_t y = row * grid.y_step + grid.y_start;
     visit_row(state, [&](const auto &load) {
-        if (state.isOneToOne != 0)
-            write_in_place(state, grid, row, area, load);
-        else if (state.interlaceFrameUsed == 0)
-            write_centres(state, grid, y, load);
-        else if (state.interlaceFrame != nullptr)
+        if (framed)
             for (uint32_t sample = 0; sample < 4; ++sample)
                 add_to_frame(state, grid, y, sample, load);
+        else if (state.isOneToOne != 0)
+            write_in_place(state, grid, row, area, load);
+        else
+            write_centres(state, grid, y, load);
     });
 }
 

@@ -1,5 +1,6 @@
 #include "png/placing.h"
 
+#include <algorithm>
 #include <cstdlib>
 #include <limits>
 
@@ -45,6 +46,13 @@ bool positions_fit(const PngDecodeState &state) {
     return rows < farthest / row_bytes;
 }
 
+// Rows of an exact buffer: those of the scaled image, which rounding may have made larger than the box.
+uint32_t rows_within_box(const PngDecodeState &state, int32_t boxWidth, int32_t boxHeight) {
+    if (boxWidth <= 0 || boxHeight <= 0) return 0;
+    const uint64_t box = static_cast<uint64_t>(boxWidth) * static_cast<uint64_t>(boxHeight);
+    return static_cast<uint32_t>(std::min<uint64_t>(state.scaledHeight, box / state.scaledWidth));
+}
+
 } // namespace
 
 void scale_png(PngDecodeState &state, uint32_t flags, uint32_t zoom, int32_t boxWidth, int32_t boxHeight) {
@@ -82,6 +90,7 @@ void place_png(PngDecodeState &state, uint32_t flags, int32_t boxWidth, int32_t 
     state.exactPlacement = placement_mode(flags) == PELM_PLACE_EXACT ? 1 : 0;
     if (state.exactPlacement != 0) {
         state.outputStride = state.scaledWidth;
+        state.exactRows = rows_within_box(state, boxWidth, boxHeight);
     } else {
         state.outputStride = static_cast<uint32_t>(boxWidth);
         state.outputOffsetX = margin(boxWidth, sideways ? state.scaledHeight : state.scaledWidth);
@@ -111,7 +120,7 @@ void use_output(PngDecodeState &state, void *output, int32_t boxWidth, int32_t b
     const bool exact = state.exactPlacement != 0;
     size_t bytes = 0;
     if (buffer_bytes(exact ? static_cast<int32_t>(state.scaledWidth) : boxWidth,
-                     exact ? static_cast<int32_t>(state.scaledHeight) : boxHeight, bytes_per_pixel(state.outputFormat),
+                     exact ? static_cast<int32_t>(state.exactRows) : boxHeight, bytes_per_pixel(state.outputFormat),
                      bytes))
         state.output.size = bytes;
 }

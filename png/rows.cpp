@@ -114,7 +114,7 @@ void finish_image(Adam7Rows &rows) {
     if (state.isOneToOne != 0 || state.interlaceFrameUsed == 0 || state.output.size == 0) return;
     state.outputCursor = static_cast<intptr_t>(first_pixel_position(state));
     divide_frame_by_alpha(state);
-    __PELMI_WriteOutputDataFromINTBuffer(&state);
+    write_frame(state, output_steps(state));
 }
 
 Stop ask_host() {

@@ -58,7 +58,7 @@ struct PngSamplePoint {
 };
 
 // Fills the record up to the size that hosts of 32-bit systems account for.
-constexpr size_t png_state_fill = 78;
+constexpr size_t png_state_fill = 77;
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed.
 struct PngDecodeState {
@@ -112,6 +112,7 @@ struct PngDecodeState {
     uint8_t idatJoined;
     uint8_t exactPlacement;
     OutputBuffer output; // of the current call
+    uint32_t exactRows;  // rows of scaledWidth pixels that an exact buffer has
     uint32_t bandBase;   // output row that the first row of the current call's buffer shows (scaled)
     uint32_t reserved[png_state_fill];
 

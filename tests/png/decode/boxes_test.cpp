@@ -3,6 +3,8 @@
 #include <cstdint>
 #include <limits>
 
+#include <sys/mman.h>
+
 #include "tests/png/decode/decoding.h"
 
 namespace pelm::test {
@@ -54,6 +56,33 @@ TEST_F(PngBoxes, that_no_buffer_can_have_end_at_once) {
         }
     EXPECT_TRUE(host.live_blocks().empty());
 }
+
+#if UINTPTR_MAX > UINT32_MAX // only large address spaces have such buffers
+TEST_F(PngBoxes, whose_rows_exceed_32_bits_are_written_through_the_frame_too) {
+    constexpr int32_t width = 600000000;
+    constexpr size_t bytes = size_t{width} * 2 * 4;
+    void *const memory =
+        mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS | MAP_NORESERVE, -1, 0);
+    ASSERT_NE(memory, MAP_FAILED);
+    Bytes file = small_png(2, 1);
+    InputSource source{};
+    source.kind = PELM_SOURCE_MEMORY;
+    source.data = file.data();
+    source.size = static_cast<int32_t>(file.size());
+    ImageDecodeInfo info{};
+    info.input = &source;
+    info.flags = PELM_INTERLACE_FRAME;
+    info.outputFormat = PELM_FORMAT_RGBA8888;
+    EXPECT_EQ(ZOTARPELMI_DecodePNG(&info, memory, width, 2), 1);
+    ASSERT_EQ(info.outputWidth, 1);
+    ASSERT_EQ(info.outputHeight, 2);
+    const auto *const pixels = static_cast<const uint8_t *>(memory);
+    const size_t column = (size_t{width} - 1) / 2;
+    for (const size_t row : {size_t{0}, size_t{1}})
+        EXPECT_EQ(pixels[(row * width + column) * 4 + 3], 255) << "alpha of the pixel in row " << row;
+    munmap(memory, bytes);
+}
+#endif
 
 } // namespace
 } // namespace pelm::test
