@@ -5,6 +5,7 @@
 
 #include <sys/mman.h>
 
+#include "png/placing.h"
 #include "tests/png/decode/decoding.h"
 
 namespace pelm::test {
@@ -57,6 +58,22 @@ TEST_F(PngBoxes, that_no_buffer_can_have_end_at_once) {
                         }
         }
     EXPECT_TRUE(host.live_blocks().empty());
+}
+
+// Both sides are reduced alike in single precision, although the height is not: the scaled image is a row too high.
+TEST_F(PngBoxes, that_the_scaled_image_outgrows_by_rounding_bound_an_exact_buffer) {
+    constexpr int32_t box_height = 16777216;
+    PngDecodeState state{};
+    state.imageWidth = 2;
+    state.imageHeight = 33554434;
+    state.outputFormat = PELM_FORMAT_RGB888;
+    uint8_t pixel = 0;
+    scale_png(state, PELM_PLACE_EXACT, 1, 1, box_height);
+    place_png(state, PELM_PLACE_EXACT, 1, box_height);
+    use_output(state, &pixel, 1, box_height);
+    EXPECT_EQ(state.scaledWidth, 1u);
+    EXPECT_EQ(state.scaledHeight, 16777217u);
+    EXPECT_EQ(state.output.size, size_t{box_height} * 3);
 }
 
 #if UINTPTR_MAX > UINT32_MAX // only large address spaces have such buffers
