@@ -1,34 +1,22 @@
 // From a request to a record that is ready to decode: header, colours, size and place in the output, buffers.
-#include <algorithm>
-#include <cstdlib>
-#include <limits>
-
 #include "bmp/colours.h"
 #include "bmp/header.h"
-#include "bmp/scaling.h"
 #include "bmp/working.h"
 #include "frame/formats.h"
 #include "frame/memory.h"
+#include "frame/scaling.h"
 #include "frame/sizes.h"
 
 namespace pelm {
 namespace {
 
-// In 64 bits even the walk over all rows stays in range from there.
-constexpr int64_t farthest_position = std::min<int64_t>(std::numeric_limits<intptr_t>::max(), int64_t{1} << 62);
-
 // The first pixel and the steps from there, in the record's units. False when they do not fit it.
 bool place_in_output(BmpState &state, Size buffer, Size scaled) {
-    const int32_t pixel_bytes = bytes_per_pixel(state.outputFormat);
-    const Placement placement = place(state.rotation, buffer, scaled);
-    const int64_t farthest_pixel = farthest_position / pixel_bytes;
-    const int64_t row_step = placement.row_step * pixel_bytes * (state.topDown != 0 ? -1 : 1);
-    const int64_t pixel_step = placement.pixel_step * pixel_bytes / pixel_step_unit(state.outputFormat);
-    if (std::abs(placement.first) > farthest_pixel || !fits_int32(row_step) || !fits_int32(pixel_step)) return false;
-
-    state.outputCursor = static_cast<intptr_t>(placement.first * pixel_bytes);
-    state.rowStep = static_cast<int32_t>(row_step);
-    state.pixelStep = static_cast<int32_t>(pixel_step);
+    BytePlacement placement{};
+    if (!place_bytes(state.rotation, buffer, scaled, bytes_per_pixel(state.outputFormat), placement)) return false;
+    state.outputCursor = placement.first;
+    state.rowStep = placement.row_step * (state.topDown != 0 ? -1 : 1);
+    state.pixelStep = placement.pixel_step / pixel_step_unit(state.outputFormat);
     return true;
 }
 
@@ -39,22 +27,27 @@ SetUp set_geometry(BmpState &state, ImageDecodeInfo &info, Size box, void *outpu
     info.decodeStarted = 1;
 
     const Size box_for_image = turns_sideways(state.rotation) ? Size{box.height, box.width} : box;
-    Scaling scaling{};
-    if (!scale_to_box({state.width, state.height}, box_for_image, mode == PELM_PLACE_STRETCH, scaling))
-        return SetUp::refused;
-    state.scaledWidth = scaling.size.width;
-    state.scaledHeight = scaling.size.height;
+    const Size image = {state.width, state.height};
+    Scaling scaling = {box_for_image.width, box_for_image.height, false};
+    if (mode != PELM_PLACE_STRETCH) {
+        if (image.height == 0 && (box_for_image.width < image.width || box_for_image.height < 0)) return SetUp::refused;
+        scaling = scale_to_fit(image, box_for_image);
+    }
+    Size scaled{};
+    if (!scaling.narrow_to(scaled)) return SetUp::refused;
+    state.scaledWidth = scaled.width;
+    state.scaledHeight = scaled.height;
     state.oneToOne = scaling.one_to_one ? 1 : 0;
 
     // Required: an exact buffer has the unturned sides of the scaled image, also when it is turned (docs/oddities.md,
     // "Exact placement of turned images").
-    const Size buffer = mode == PELM_PLACE_EXACT ? scaling.size : box;
+    const Size buffer = mode == PELM_PLACE_EXACT ? scaled : box;
     state.outputFormat = info.outputFormat;
     size_t bytes = 0;
     if (!buffer_bytes(buffer.width, buffer.height, bytes_per_pixel(state.outputFormat), bytes)) return SetUp::refused;
     if (bytes == 0 || state.scaledWidth <= 0 || state.scaledHeight <= 0) return SetUp::done; // nothing will be written
     state.output = {static_cast<uint8_t *>(output), output == nullptr ? 0 : bytes};
-    return place_in_output(state, buffer, scaling.size) ? SetUp::done : SetUp::refused;
+    return place_in_output(state, buffer, scaled) ? SetUp::done : SetUp::refused;
 }
 
 bool allocate_staging(BmpState &state, InputSource &input) {

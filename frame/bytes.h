@@ -20,6 +20,13 @@ inline int32_t read_i32le(const uint8_t *at) {
     return static_cast<int32_t>(read_u32le(at));
 }
 
+inline uint64_t read_u64le(const uint8_t *at) {
+    static_assert(std::endian::native == std::endian::little, "read as one value");
+    uint64_t value;
+    std::memcpy(&value, at, sizeof value);
+    return value;
+}
+
 inline uint16_t read_u16be(const uint8_t *at) {
     return static_cast<uint16_t>(at[0] << 8 | at[1]);
 }

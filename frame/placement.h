@@ -35,4 +35,13 @@ struct Placement {
 // Centres an image of size `scaled` (in its own orientation) in a buffer, rounding the margins down.
 Placement place(int32_t rotation, Size buffer, Size scaled);
 
+// The same in bytes.
+struct BytePlacement {
+    intptr_t first;
+    int32_t row_step, pixel_step;
+};
+
+// False when it does not fit that record. The walk over all rows stays in range from there, in 64 bits.
+bool place_bytes(int32_t rotation, Size buffer, Size scaled, int32_t pixel_bytes, BytePlacement &placement);
+
 } // namespace pelm

@@ -42,17 +42,27 @@ void write_row_as(uint32_t format, const Load &load, int32_t from, int32_t count
     }
 }
 
+// A list of output formats: how wide their pixels are, 0 for a code that is not in it, and how a row is written.
+struct FullColourFormats {
+    static constexpr int32_t size(uint32_t format) { return bytes_per_pixel(format); }
+    template <class Load>
+    static void write_row(uint32_t format, const Load &load, int32_t from, int32_t count, uint8_t *out,
+                          ptrdiff_t step) {
+        write_row_as(format, load, from, count, out, step);
+    }
+};
+
 // The same for a row that starts at byte `position` of a buffer: pixels that do not lie wholly inside are dropped.
-template <class Load>
+template <class Formats = FullColourFormats, class Load>
 void write_row_clipped(const OutputBuffer &buffer, int64_t position, int64_t step, uint32_t format, const Load &load,
                        int32_t from, int32_t count) {
-    const int32_t size = bytes_per_pixel(format);
+    const int32_t size = Formats::size(format);
     if (size == 0) return;
     const Run inside = clip_run(position, step, count, size, buffer.size);
     if (inside.count == 0) return;
     uint8_t *const first = buffer.start + static_cast<ptrdiff_t>(position + inside.first * step);
-    write_row_as(format, load, from + static_cast<int32_t>(inside.first), inside.count, first,
-                 static_cast<ptrdiff_t>(step));
+    Formats::write_row(format, load, from + static_cast<int32_t>(inside.first), inside.count, first,
+                       static_cast<ptrdiff_t>(step));
 }
 
 } // namespace pelm

@@ -181,6 +181,57 @@ typedef struct PngTrInfo {
 PELM_API PngTrInfo *PELMI_FastImgCreatePngTrInfo(void);
 PELM_API int32_t PELMI_FastImgDestroyPngTrInfo(PngTrInfo *record);
 
+/*
+ * The first image of a GIF, drawn from the left edge of the logical screen on, in formats 0, 1, 5, 7, 8, 10, 11 and 12.
+ * The screen's size decides the size in the output. Transparent pixels show their colour; hasTransparency tells of them.
+ * When globalColorTable is not NULL every colour table is copied there as it is in the file (768 bytes at most).
+ * docs/formats.md lists what is refused, docs/oddities.md what may surprise.
+ *
+ * A decode that one kind of call has begun goes on with the same kind only: another one gives 0 and leaves it. Do not
+ * hand over a decoderState of another image format.
+ */
+
+/* The whole image. PELM_RESULT_DONE, also for a truncated file (rows that are missing become zeros where docs/formats.md
+ * says so), or PELM_RESULT_FAILED. Neither reads nor writes decoderState. A file that breaks off, or is malformed,
+ * between its header and its first image LEAKS the decode's memory: nothing can free it. */
+PELM_API int32_t ZOTARPELMI_DecodeGIF(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
+
+/* About 16 rows per call: PELM_RESULT_MORE until the image has ended, then PELM_RESULT_DONE or PELM_RESULT_FAILED. The
+ * first call decodes no row; the output arguments of later ones are not looked at. Leaks as ZOTARPELMI_DecodeGIF. */
+PELM_API int32_t ZOTARPELMI_DecodeGIFIter(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
+
+/* Gives up a decode in progress and frees all of it. 1, or 0 for a NULL `info`. */
+PELM_API int32_t ZOTARPELMI_AbortGIFIter(ImageDecodeInfo *info);
+
+/* Up to `rowsWanted` further rows, unturned and left-aligned, to a buffer of rowsWanted rows of outWidth pixels. Call
+ * again while decoderState is not NULL: PELM_RESULT_DONE for the rows of a call, PELM_RESULT_FAILED when there are no
+ * more although the image is not complete. Interlaced images are refused; nothing leaks. A reduced image needs one more
+ * call behind its last row, which writes nothing. */
+PELM_API int32_t ZOTARPELMI_DecodeGIFLine(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight,
+                                          int32_t rowsWanted);
+
+/*
+ * Animations: every frame is the whole screen, composed of what the frames before left and the frame's own pixels, by
+ * their disposal. Timing and loops are the caller's: after the last frame the next call begins again with the first.
+ * The output arguments count on the first call of a decode only. PelmHost's PelmAnimation.h tells what a player wants to
+ * know beforehand. Other formats and general rules as for still images; nothing leaks.
+ */
+
+/* One frame per call: PELM_RESULT_DONE when another one follows, PELM_RESULT_LAST_FRAME for the last one (the decode's
+ * memory has been freed), or PELM_RESULT_FAILED (likewise). Sets frameDelay and colorTableState. The first call of a
+ * decode overwrites globalColorTable and localColorTable with new blocks of 1024 bytes from ZOTARPELM_OsMalloc: the
+ * CALLER frees and clears both after each decode, also after a failed one. globalColorTable then holds the global
+ * table's raw RGB triplets. localColorTable holds, after a call, the raw triplets of the next frame's own table, or
+ * zeros. */
+PELM_API int32_t ZOTARPELMI_DecodeAGIF(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
+
+/* The same in slices of about 16 rows: PELM_RESULT_MORE while a frame is in progress. Allocates no tables and sets
+ * hasTransparency, of the next frame, only. */
+PELM_API int32_t ZOTARPELMI_DecodeAGIFIter(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
+
+/* Gives up an animation and frees its state, but not the two tables. 1, or 0 for a NULL `info`. */
+PELM_API int32_t ZOTARPELMI_AborAGIF(ImageDecodeInfo *info);
+
 /* The animated-GIF words of the request; 0 or NULL for a NULL `info`. */
 PELM_API uint32_t ZOTARPELMI_GetAGIFDelayTime(const ImageDecodeInfo *info);
 PELM_API uint32_t ZOTARPELMI_GetAGIFColorTableState(const ImageDecodeInfo *info);

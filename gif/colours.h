@@ -1,0 +1,105 @@
+// Packed colours, R << 20 | G << 10 | B, and the output formats that GIF writes.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/write_row.h"
+#include "gif/state.h"
+
+namespace pelm {
+
+struct PackedColour {
+    uint32_t word;
+};
+
+constexpr uint32_t packed_colour(uint8_t r, uint8_t g, uint8_t b) {
+    return static_cast<uint32_t>(r) << 20 | static_cast<uint32_t>(g) << 10 | b;
+}
+
+// A pixel that no frame has painted has all bits set, and so comes out white.
+constexpr Rgb channels_of(PackedColour colour) {
+    return {static_cast<uint8_t>(colour.word >> 20), static_cast<uint8_t>(colour.word >> 10),
+            static_cast<uint8_t>(colour.word)};
+}
+
+constexpr uint16_t rgb565_of(PackedColour colour) {
+    return rgb565_of(channels_of(colour));
+}
+
+constexpr Rgb swapped_channels_of(PackedColour colour) {
+    const Rgb c = channels_of(colour);
+    return {c.b, c.g, c.r};
+}
+
+struct StoreBgr565 {
+    static constexpr int32_t size = 2;
+    static void put(uint8_t *at, PackedColour colour) { put_rgb565(at, swapped_channels_of(colour)); }
+};
+
+struct StoreBgr888 {
+    static constexpr int32_t size = 3;
+    static void put(uint8_t *at, PackedColour colour) { put_rgb888(at, swapped_channels_of(colour)); }
+};
+
+// Required: this format alone shows what no frame has painted as transparent black (docs/oddities.md, "What no frame
+// has painted").
+struct StoreCanvasRgba8888 {
+    static constexpr int32_t size = 4;
+    static void put(uint8_t *at, PackedColour colour) {
+        const Rgb c = channels_of(colour);
+        const uint32_t painted = colour.word == gif_never_painted ? 0 : 0xFF;
+        store_4(at, static_cast<uint8_t>(c.r & painted), static_cast<uint8_t>(c.g & painted),
+                static_cast<uint8_t>(c.b & painted), static_cast<uint8_t>(painted));
+    }
+};
+
+// The formats that GIF writes: see write_row_clipped.
+struct GifFormats {
+    static constexpr int32_t size(uint32_t format) {
+        switch (format) {
+        case PELM_FORMAT_RGB565_A8: return 0;
+        case PELM_FORMAT_BGR565: return 2;
+        case PELM_FORMAT_BGR888: return 3;
+        case PELM_FORMAT_BGRX8888: return 4;
+        default: return bytes_per_pixel(format);
+        }
+    }
+
+    template <class Load>
+    static void write_row(uint32_t format, const Load &load, int32_t from, int32_t count, uint8_t *out,
+                          ptrdiff_t step) {
+        switch (format) {
+        case PELM_FORMAT_RGB565: return write_run_as<StoreRgb565>(load, from, count, out, step);
+        case PELM_FORMAT_RGB888: return write_run_as<StoreRgb888>(load, from, count, out, step);
+        case PELM_FORMAT_ARGB8888: return write_run_as<StoreArgb8888>(load, from, count, out, step);
+        case PELM_FORMAT_RGBA8888: return write_run_as<StoreCanvasRgba8888>(load, from, count, out, step);
+        case PELM_FORMAT_BGR565: return write_run_as<StoreBgr565>(load, from, count, out, step);
+        case PELM_FORMAT_BGR888: return write_run_as<StoreBgr888>(load, from, count, out, step);
+        case PELM_FORMAT_BGRA8888:
+        case PELM_FORMAT_BGRX8888: return write_run_as<StoreBgra8888>(load, from, count, out, step);
+        default: return;
+        }
+    }
+};
+
+// The steps of the 16-bit formats count pixels, those of all others bytes.
+constexpr int32_t gif_step_unit(uint32_t format) {
+    return GifFormats::size(format) == 2 ? 2 : 1;
+}
+
+// A row of palette indices.
+struct IndexedColours {
+    const uint8_t *row;
+    const uint32_t *table;
+
+    PackedColour operator()(int32_t x) const { return {table[row[x]]}; }
+};
+
+// A row of packed colours.
+struct PackedColours {
+    const uint32_t *row;
+
+    PackedColour operator()(int32_t x) const { return {row[x]}; }
+};
+
+} // namespace pelm
