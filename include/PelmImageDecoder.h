@@ -213,8 +213,8 @@ PELM_API int32_t ZOTARPELMI_DecodeGIFLine(ImageDecodeInfo *info, void *outBuffer
 /*
  * Animations: every frame is the whole screen, composed of what the frames before left and the frame's own pixels, by
  * their disposal. Timing and loops are the caller's: after the last frame the next call begins again with the first.
- * The output arguments count on the first call of a decode only. PelmHost's PelmAnimation.h tells what a player wants to
- * know beforehand. Other formats and general rules as for still images; nothing leaks.
+ * The output arguments count on the first call of a decode only. PelmAnimation.h of the default host library tells what
+ * a player wants to know beforehand. Formats and general rules are those of still images; nothing leaks.
  */
 
 /* One frame per call: PELM_RESULT_DONE when another one follows, PELM_RESULT_LAST_FRAME for the last one (the decode's
