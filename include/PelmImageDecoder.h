@@ -192,8 +192,8 @@ PELM_API int32_t PELMI_FastImgDestroyPngTrInfo(PngTrInfo *record);
  */
 
 /* The whole image. PELM_RESULT_DONE, also for a truncated file (rows that are missing become zeros where
- * docs/formats.md says so), or PELM_RESULT_FAILED. Neither reads nor writes decoderState. A file that breaks off, or is malformed,
- * between its header and its first image LEAKS the decode's memory: nothing can free it. */
+ * docs/formats.md says so), or PELM_RESULT_FAILED. Neither reads nor writes decoderState. A file that breaks off, or is
+ * malformed, between its header and its first image LEAKS the decode's memory: nothing can free it. */
 PELM_API int32_t ZOTARPELMI_DecodeGIF(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
 
 /* About 16 rows per call: PELM_RESULT_MORE until the image has ended, then PELM_RESULT_DONE or PELM_RESULT_FAILED. The
