@@ -2,8 +2,6 @@
 // to the next.
 #include "frame/bytes.h"
 #include "frame/host.h"
-#include "frame/memory.h"
-#include "gif/colours.h"
 #include "gif/input.h"
 #include "gif/pixel_buffer.h"
 
@@ -91,6 +89,7 @@ Walk read_image_descriptor(GifDecoderState &state, InputSource *source) {
     state.lzwMinCodeSize = take(input, 1)[0];
     if (state.lzwMinCodeSize > 12 || !reserve_pixel_row(state, state.imageWidth)) return Walk::failed;
     state.sourceRow = 0;
+    state.coloursAreFinished = 0;
     return Walk::image;
 }
 
@@ -106,11 +105,6 @@ Walk read_block(GifDecoderState &state, InputSource *source) {
 
 } // namespace
 } // namespace pelm
-
-void PELMI_MakeColorTable(const uint8_t *raw, int32_t count, uint32_t *table) {
-    for (int32_t i = 0; i < count; ++i)
-        table[i] = pelm::packed_colour(raw[3 * i], raw[3 * i + 1], raw[3 * i + 2]);
-}
 
 int32_t PELMI_ParseGIFHeader(InputSource *source, GifDecoderState *state) {
     GifInput &input = *state->input;

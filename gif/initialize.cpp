@@ -105,7 +105,7 @@ bool set_up(GifDecoderState &state, const ImageDecodeInfo &info, Size box, uint3
 bool reserve_pixel_row(GifDecoderState &state, int32_t width) {
     if (state.pixelBuffer != nullptr && width <= state.pixelBufferWidth) return true;
     free_block(state.pixelBuffer);
-    state.pixelBuffer = allocate_zeroed<uint8_t>(static_cast<uint32_t>(width + longest_string));
+    state.pixelBuffer = allocate_zeroed<uint8_t>(static_cast<uint32_t>(width + longest_string + written_behind));
     state.pixelBufferWidth = width;
     return state.pixelBuffer != nullptr;
 }
@@ -117,12 +117,17 @@ int32_t PELMI_CreateGIFDecoderInfo(GifDecoderState *state) {
     if ((state->input = pelm::new_record<GifInput>()) == nullptr) return 0;
     if ((state->input->buffer = allocate_array<uint8_t>(gif_input_bytes)) == nullptr) return 0;
     if ((state->globalTable = allocate_array<uint32_t>(256)) == nullptr) return 0;
-    if ((state->localTable = allocate_array<uint32_t>(256)) == nullptr) return 0;
+    if ((state->localTable = allocate_array<uint32_t>(2 * 256)) == nullptr) return 0;
+    state->finishedTable = state->localTable + 256;
     if ((state->lzw = allocate_array<GifLzwTables>(1)) == nullptr) return 0;
     *state->lzw = {};
     if ((state->lzw->prefix = allocate_array<uint32_t>(gif_table_entries)) == nullptr) return 0;
     if ((state->lzw->suffix = allocate_array<uint8_t>(gif_table_entries)) == nullptr) return 0;
-    return (state->lzw->length = allocate_array<uint32_t>(gif_table_entries)) != nullptr ? 1 : 0;
+    auto *const lengths = allocate_array<GifStringLengths>(1);
+    if (lengths == nullptr) return 0;
+    state->lzw->length = lengths->length;
+    state->fastStrings = &lengths->fast;
+    return 1;
 }
 
 void PELMI_DelGIFDecoderInfo(GifDecoderState *state) {

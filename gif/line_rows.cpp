@@ -12,17 +12,17 @@ OutputRow next_output_row(const GifDecoderState &state, intptr_t start) {
     return {start + int64_t{state.rowsOut} * state.requestedWidth * size, size};
 }
 
-void write_whole_row(const GifDecoderState &state, intptr_t start) {
+void write_whole_row(GifDecoderState &state, intptr_t start) {
     const OutputRow row = next_output_row(state, start);
-    write_row_clipped<GifFormats>(state.output, row.position, row.step, state.outputFormat,
-                                  IndexedColours{state.pixelBuffer, state.activeTable}, 0,
-                                  std::min(state.imageWidth, state.requestedWidth));
+    write_row_clipped<FinishedFormats>(state.output, row.position, row.step, state.outputFormat,
+                                       IndexedRow{state.pixelBuffer, finished_colours(state)}, 0,
+                                       std::min(state.imageWidth, state.requestedWidth));
 }
 
-void write_sampled_row(const GifDecoderState &state, intptr_t start) {
+void write_sampled_row(GifDecoderState &state, intptr_t start) {
     const OutputRow row = next_output_row(state, start);
-    write_samples(state, row.position, row.step, IndexedColours{state.pixelBuffer, state.activeTable}, state.imageWidth,
-                  std::min(state.scaledWidth, state.requestedWidth));
+    write_samples(state, row.position, row.step, IndexedRow{state.pixelBuffer, finished_colours(state)},
+                  state.imageWidth, std::min(state.scaledWidth, state.requestedWidth));
 }
 
 } // namespace

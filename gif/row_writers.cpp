@@ -19,7 +19,8 @@ void write_one_to_one(const GifDecoderState &state, intptr_t start, const Load &
     if (state.sourceRow >= state.screenHeight) return;
     const OutputRow row = output_row(state, start, state.sourceRow);
     const int64_t step = always_steps_forward(state.outputFormat) ? 4 : row.step;
-    write_row_clipped<GifFormats>(state.output, row.position, step, state.outputFormat, load, 0, state.screenWidth);
+    write_row_clipped<typename Load::Formats>(state.output, row.position, step, state.outputFormat, load, 0,
+                                              state.screenWidth);
 }
 
 // The output rows that show the screen's row: none or one, and several where the image is enlarged.
@@ -38,24 +39,27 @@ void write_scaled(const GifDecoderState &state, intptr_t start, const Load &load
     }
 }
 
+IndexedRow still_row(GifDecoderState &state) {
+    return {state.pixelBuffer, finished_colours(state)};
+}
+
 } // namespace
 } // namespace pelm
 
 void PELMI_WriteGIFOneToOneRow(GifDecoderState *state, intptr_t outBuffer) {
     // Required: as many pixels as the screen has columns, from its left edge on (docs/oddities.md, "Still images fill
     // the screen").
-    pelm::write_one_to_one(*state, outBuffer, pelm::IndexedColours{state->pixelBuffer, state->activeTable});
+    pelm::write_one_to_one(*state, outBuffer, pelm::still_row(*state));
 }
 
 void PELMI_DownsizeGIFRow(GifDecoderState *state, intptr_t outBuffer) {
-    pelm::write_scaled(*state, outBuffer, pelm::IndexedColours{state->pixelBuffer, state->activeTable},
-                       state->imageWidth);
+    pelm::write_scaled(*state, outBuffer, pelm::still_row(*state), state->imageWidth);
 }
 
 void PELMI_WriteAGIFOneToOneRow(GifDecoderState *state, intptr_t outBuffer) {
-    pelm::write_one_to_one(*state, outBuffer, pelm::PackedColours{state->canvasRow});
+    pelm::write_one_to_one(*state, outBuffer, pelm::PackedRow{state->canvasRow});
 }
 
 void PELMI_DownsizeAGIFRow(GifDecoderState *state, intptr_t outBuffer) {
-    pelm::write_scaled(*state, outBuffer, pelm::PackedColours{state->canvasRow}, state->screenWidth);
+    pelm::write_scaled(*state, outBuffer, pelm::PackedRow{state->canvasRow}, state->screenWidth);
 }

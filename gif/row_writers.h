@@ -19,6 +19,14 @@ inline OutputRow output_row(const GifDecoderState &state, intptr_t start, int64_
     return {start + row * state.rowStep * unit, int64_t{state.pixelStep} * unit};
 }
 
+template <class Load>
+struct GatheredRow {
+    using Formats = typename Load::Formats;
+    const typename Load::Pixel *row;
+
+    typename Load::Pixel operator()(int32_t x) const { return row[x]; }
+};
+
 // Writes the samples at the centres of the output's pixels: output pixel j shows column (j x screenWidth +
 // screenWidth / 2) / scaledWidth. At most `limit` of them, and those only whose column is below `pixels`.
 template <class Load>
@@ -26,18 +34,18 @@ void write_samples(const GifDecoderState &state, int64_t position, int64_t step,
                    int32_t limit) {
     constexpr int32_t at_once = 256; // keeps the sampling loop apart from the conversion's
     if (state.output.size == 0 || state.scaledWidth <= 0 || pixels <= 0) return;
-    uint32_t colours[at_once];
+    typename Load::Pixel gathered[at_once];
     SampleWalk column(state.screenWidth >> 1, state.screenWidth, state.scaledWidth);
     const auto end = static_cast<uint32_t>(pixels);
     for (int32_t done = 0; done < limit && column.at < end;) {
         const int32_t wanted = std::min(at_once, limit - done);
         int32_t count = 0;
         for (; count < wanted && column.at < end; ++count) {
-            colours[count] = load(static_cast<int32_t>(column.at)).word;
+            gathered[count] = load(static_cast<int32_t>(column.at));
             column.advance();
         }
-        write_row_clipped<GifFormats>(state.output, position, step, state.outputFormat, PackedColours{colours}, 0,
-                                      count);
+        write_row_clipped<typename Load::Formats>(state.output, position, step, state.outputFormat,
+                                                  GatheredRow<Load>{gathered}, 0, count);
         done += count;
         position += count * step;
     }

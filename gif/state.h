@@ -27,6 +27,18 @@ struct GifLzwTables {
 
 static_assert(pelm::lies_on_word(sizeof(GifLzwTables), 3));
 
+// The same strings, cut into groups of eight pixels: gif/lzw/fast_strings.h.
+struct GifFastStrings {
+    uint64_t group[gif_table_entries];
+    uint32_t link[gif_table_entries];
+};
+
+// One allocation: what GifLzwTables.length points to, and room behind it.
+struct GifStringLengths {
+    uint32_t length[gif_table_entries];
+    GifFastStrings fast;
+};
+
 // Which calls a parked record belongs to: no others go on with it.
 enum GifCalls : uint32_t { GIF_ONE_SHOT, GIF_ITERATIVE, GIF_BY_LINES, GIF_BY_FRAMES, GIF_FRAMES_ITERATIVE };
 
@@ -93,7 +105,12 @@ struct GifDecoderState {
     GifPhase framePhase;
     GifCalls startedBy;
     GifEnding ending;
-    uint32_t reserved[6];
+    GifFastStrings *fastStrings; // NULL: every image is decoded by the careful loop alone
+    uint32_t usesFastStrings;    // 1 as long as the current image's data is as encoders write it
+    uint32_t savedFilled;
+    uint32_t *finishedTable;     // 256 pixels of the output format: behind the local table
+    uint32_t coloursAreFinished; // 1 once they are those of the current image
+    uint32_t reserved[1];
 };
 
 // A canvas pixel that no frame has painted.

@@ -183,8 +183,8 @@ PELM_API int32_t PELMI_FastImgDestroyPngTrInfo(PngTrInfo *record);
 
 /*
  * The first image of a GIF, drawn from the left edge of the logical screen on, in formats 0, 1, 5, 7, 8, 10, 11 and 12.
- * The screen's size decides the size in the output. Transparent pixels show their colour; hasTransparency tells of them.
- * When globalColorTable is not NULL every colour table is copied there as it is in the file (768 bytes at most).
+ * The screen's size decides the size in the output. Transparent pixels show their colour; hasTransparency tells of
+ * them. When globalColorTable is not NULL every colour table is copied there as it is in the file (768 bytes at most).
  * docs/formats.md lists what is refused, docs/oddities.md what may surprise.
  *
  * A decode that one kind of call has begun goes on with the same kind only: another one gives 0 and leaves it. Do not

@@ -89,7 +89,8 @@ bool begin_image(GifDecoderState &state, InputSource *source) {
     state.savedBitBuffer = state.savedBitCount = 0;
     state.savedBlockLeft = state.savedPixelCount = state.savedRowsDone = 0;
     state.ending = GIF_FAILED;
-    if (PELMI_InitializeTransTBL(state.lzwMinCodeSize, state.lzw) == 0 || !have_bytes(input, source, 1)) return false;
+    if (state.lzwMinCodeSize >= widest_code || !have_bytes(input, source, 1)) return false;
+    begin_strings(state);
     input.bytesLeft = gif_top_up(source, input.buffer, input.cursor, input.bytesLeft);
     input.cursor = input.buffer;
 

@@ -1,13 +1,14 @@
 #include "gif/lzw/loop.h"
 
 #include "frame/host.h"
+#include "gif/lzw/fast_loop.h"
+#include "gif/lzw/fast_strings.h"
 #include "gif/lzw/table.h"
 #include "gif/pixel_buffer.h"
+#include "gif/working.h"
 
 namespace pelm {
 namespace {
-
-constexpr uint32_t widest_code = 12;
 
 bool end_image(Lzw &lzw, GifEnding ending) {
     lzw.ending = ending;
@@ -37,46 +38,7 @@ void grow_table(Lzw &lzw, uint32_t prefix) {
     if (lzw.next_code == 1u << lzw.code_size && lzw.code_size < widest_code) ++lzw.code_size;
 }
 
-} // namespace
-
-Lzw restore(const GifDecoderState &state, InputSource *source) {
-    Lzw lzw{};
-    lzw.codes = open_codes(state, source);
-    lzw.tables = *state.lzw;
-    lzw.pixels = state.pixelBuffer;
-    lzw.pixel_count = state.savedPixelCount;
-    lzw.min_code_size = state.lzwMinCodeSize;
-    lzw.clear_code = 1u << state.lzwMinCodeSize;
-    lzw.end_code = lzw.clear_code + 1;
-    lzw.code_size = state.savedCodeSize;
-    lzw.next_code = state.savedNextCode;
-    lzw.previous = state.savedPrevCode;
-    lzw.first_pixel = static_cast<uint8_t>(state.savedFirstPixel);
-    return lzw;
-}
-
-void save(Lzw &lzw, GifDecoderState &state) {
-    close_codes(lzw.codes, state);
-    state.savedPixelCount = lzw.pixel_count;
-    state.savedCodeSize = lzw.code_size;
-    state.savedNextCode = lzw.next_code;
-    state.savedPrevCode = lzw.previous;
-    state.savedCode = lzw.previous;
-    state.savedFirstPixel = lzw.first_pixel;
-}
-
-bool read_first_code(Lzw &lzw) {
-    uint32_t code = lzw.clear_code;
-    while (code == lzw.clear_code)
-        if (!read_code(lzw.codes, lzw.code_size, code)) return end_image(lzw, lzw.codes.ending);
-    if (code == lzw.end_code) return end_image(lzw, GIF_ENDED);
-    lzw.first_pixel = static_cast<uint8_t>(code);
-    lzw.pixels[lzw.pixel_count++] = lzw.first_pixel;
-    lzw.previous = code;
-    return true;
-}
-
-bool fill_row(Lzw &lzw, int32_t width) {
+bool fill_row_carefully(Lzw &lzw, int32_t width) {
     while (lzw.pixel_count < width) {
         uint32_t code = 0;
         if (!read_code(lzw.codes, lzw.code_size, code)) return end_image(lzw, lzw.codes.ending);
@@ -97,6 +59,78 @@ bool fill_row(Lzw &lzw, int32_t width) {
         lzw.previous = code;
     }
     return true;
+}
+
+// The rest of the image is decoded carefully.
+void leave_fast_tables(Lzw &lzw) {
+    to_careful_tables(*lzw.fast, lzw.clear_code, lzw.filled, lzw.tables);
+    lzw.fast = nullptr;
+}
+
+// Only a still image that is narrower than the screen shows what lies behind the waiting pixels.
+bool shows_pixels_behind(const GifDecoderState &state) {
+    return state.animated == 0 && state.oneToOne != 0 && state.imageWidth < state.screenWidth;
+}
+
+} // namespace
+
+void begin_strings(GifDecoderState &state) {
+    state.usesFastStrings = state.fastStrings != nullptr && !shows_pixels_behind(state) ? 1 : 0;
+    state.savedFilled = 0;
+    if (state.usesFastStrings != 0)
+        begin_fast_strings(*state.fastStrings, 1u << state.lzwMinCodeSize);
+    else
+        PELMI_InitializeTransTBL(state.lzwMinCodeSize, state.lzw);
+}
+
+Lzw restore(const GifDecoderState &state, InputSource *source) {
+    Lzw lzw{};
+    lzw.codes = open_codes(state, source);
+    lzw.tables = *state.lzw;
+    lzw.fast = state.usesFastStrings != 0 ? state.fastStrings : nullptr;
+    lzw.filled = state.savedFilled;
+    lzw.pixels = state.pixelBuffer;
+    lzw.pixel_count = state.savedPixelCount;
+    lzw.min_code_size = state.lzwMinCodeSize;
+    lzw.clear_code = 1u << state.lzwMinCodeSize;
+    lzw.end_code = lzw.clear_code + 1;
+    lzw.code_size = state.savedCodeSize;
+    lzw.next_code = state.savedNextCode;
+    lzw.previous = state.savedPrevCode;
+    lzw.first_pixel = static_cast<uint8_t>(state.savedFirstPixel);
+    return lzw;
+}
+
+void save(Lzw &lzw, GifDecoderState &state) {
+    close_codes(lzw.codes, state);
+    state.usesFastStrings = lzw.fast != nullptr ? 1 : 0;
+    state.savedFilled = lzw.filled;
+    state.savedPixelCount = lzw.pixel_count;
+    state.savedCodeSize = lzw.code_size;
+    state.savedNextCode = lzw.next_code;
+    state.savedPrevCode = lzw.previous;
+    state.savedCode = lzw.previous;
+    state.savedFirstPixel = lzw.first_pixel;
+}
+
+bool read_first_code(Lzw &lzw) {
+    uint32_t code = lzw.clear_code;
+    while (code == lzw.clear_code)
+        if (!read_code(lzw.codes, lzw.code_size, code)) return end_image(lzw, lzw.codes.ending);
+    if (code == lzw.end_code) return end_image(lzw, GIF_ENDED);
+    lzw.first_pixel = static_cast<uint8_t>(code);
+    lzw.pixels[lzw.pixel_count++] = lzw.first_pixel;
+    lzw.previous = code;
+    return true;
+}
+
+bool fill_row(Lzw &lzw, int32_t width) {
+    if (lzw.fast != nullptr) {
+        const FastFill filled = fill_row_fast(lzw, width);
+        if (filled != FastFill::irregular) return filled == FastFill::full;
+        leave_fast_tables(lzw);
+    }
+    return fill_row_carefully(lzw, width);
 }
 
 void drop_row(Lzw &lzw, int32_t width) {
