@@ -42,8 +42,8 @@ enum {
 
 /*
  * Output pixel formats: ImageDecodeInfo.outputFormat. Named in the order of bytes in memory, except for the 16-bit
- * ones, which are values in native byte order. BMP and PNG write 0, 1, 5, 6, 7 and 8. A code that a decoder does not
- * write is not refused: the call succeeds and the output stays as it was.
+ * ones, which are values in native byte order. BMP and PNG write 0, 1, 5, 6, 7 and 8, WBMP 0, 1, 7 and 8. A code that a
+ * decoder does not write is not refused: the call succeeds and the output stays as it was. Only WBMP fails then.
  */
 enum {
     PELM_FORMAT_RGB565 = 0,    /* 2 bytes: (R >> 3) << 11 | (G >> 2) << 5 | (B >> 3) */
@@ -81,7 +81,7 @@ enum {
 typedef struct InputSource {
     uint32_t kind;     /* PELM_SOURCE_ */
     uint8_t *data;     /* kind 1: the caller's bytes. Kinds 0 and 2: a staging buffer that the library allocates
-                          and frees; the caller neither sets nor frees it */
+                          and frees; the caller neither sets nor frees it (WBMP, kind 0: NULL after every call) */
     void *hostContext; /* the host services' own */
     int32_t size;      /* bytes at `data` (kind 1), or in the whole stream */
     int32_t consumed; /* bytes delivered so far, written by the host services (and PNG). A read that gives nothing while
@@ -138,6 +138,15 @@ PELM_API int32_t ZOTARPELMI_DecodeBMP(ImageDecodeInfo *info, void *output, int32
 /* Frees the BMP state record that a decode in progress left in `decoderState`, and its palette; nothing else that
  * hangs from it. Returns 1, or 0 for a NULL `info`. */
 PELM_API int32_t PELMI_BMP_DestroyBMP(ImageDecodeInfo *info);
+
+/*
+ * A whole WBMP of type 0, from memory (kind 1) or a seekable stream (kind 0 only). Writes formats 0, 1, 7 and 8, black
+ * and white pixel for pixel, in five levels of grey where it is reduced; black is transparent (alpha 0) in the former.
+ * `flags` must be PELM_PLACE_STRETCH to stretch; with any other value the image is fitted, and never turned.
+ * Returns PELM_RESULT_DONE, also when nothing is left of the image in the box (`outputWidth` and `outputHeight` are set
+ * only when something is), or PELM_RESULT_FAILED, also for formats that it does not write.
+ */
+PELM_API int32_t ZOTARPELMI_DecodeWBMP(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
 
 /*
  * PNG of every colour type and depth. An alpha channel, tRNS alphas and a transparent

@@ -6,6 +6,7 @@
 
 #include "frame/formats.h"
 #include "frame/placement.h"
+#include "frame/single.h"
 #include "frame/sizes.h"
 
 namespace pelm {
@@ -26,13 +27,6 @@ uint32_t margin(int32_t box, uint32_t placed) {
 
 int64_t pixel_position(const PngDecodeState &state, int64_t column, int64_t row) {
     return (row * int64_t{state.outputStride} + column) * bytes_per_pixel(state.outputFormat);
-}
-
-// Rounded to single precision, also by processors that compute in more: they round when they store.
-template <class Number>
-float single(Number value) {
-    const volatile float stored = static_cast<float>(value);
-    return stored;
 }
 
 // Whether every position that rows and columns can lead to stays far within 64 bits. Boxes of impossible sizes, and the
@@ -73,8 +67,8 @@ void scale_png(PngDecodeState &state, uint32_t flags, uint32_t zoom, int32_t box
         state.isOneToOne = zoom == 1 ? 1 : 0;
         return;
     }
-    const float across = single(single(width) / single(box_x));
-    const float down = single(single(height) / single(box_y));
+    const float across = single_quotient(width, box_x);
+    const float down = single_quotient(height, box_y);
     // Required: the products wrap at 32 bits (docs/oddities.md, "Huge PNG sizes").
     if (across < down) {
         state.scaledHeight = box_y;
