@@ -6,6 +6,7 @@
 #include "samples/png_writer.h"
 #include "samples/quantise.h"
 #include "samples/scene.h"
+#include "samples/wbmp_writer.h"
 
 namespace pelm_samples {
 namespace {
@@ -137,9 +138,14 @@ bool write_pngs(const std::string &folder, const Drawing &scene) {
            write_png(folder + "/sunset-grey.png", grey_png(scene));
 }
 
+// Only black and white.
+bool write_wbmp_of(const std::string &path, const Drawing &scene) {
+    return write_wbmp(path, scene.width, scene.height, indexed(scene, 1, {{0, 0, 0}, {255, 255, 255}}).values);
+}
+
 bool write_all(const std::string &folder) {
     const Drawing scene = draw_scene();
-    return write_bmps(folder, scene) && write_pngs(folder, scene);
+    return write_bmps(folder, scene) && write_pngs(folder, scene) && write_wbmp_of(folder + "/sunset.wbmp", scene);
 }
 
 } // namespace

@@ -152,6 +152,8 @@ Picture blank_picture_for(const Decoding &decoding) {
 // What the decoder does to this kind of image with these options.
 std::vector<std::string> notes_on(const Decoding &decoding) {
     std::vector<std::string> notes = decoding.description.notes;
+    if (decoding.image.black_is_clear && decoding.options.format->has_alpha && keeps_its_size(decoding))
+        notes.push_back("the decoder writes black as transparent; use --format rgb");
     if (!decoding.image.turns_only_reduced) return notes;
     const bool keeps_size = keeps_its_size(decoding);
     const bool is_grey_8 = decoding.description.is_grey_8;
@@ -209,10 +211,12 @@ Decoded decode(Input &input, const ImageFormat &image, const ImageDescription &d
     if (!writes(image, *options.format)) {
         throw Failure(std::string("the ") + image.name + " decoder does not write the format " + options.format->name);
     }
+    if (image.never_turns && options.rotation != PELM_ROTATE_0)
+        throw Failure(std::string("the ") + image.name + " decoder does not turn images");
     if (description.is_interlaced && options.mode.calls == Calls::by_lines)
         throw Failure("an interlaced image cannot be decoded by lines");
     if (options.mode.calls != Calls::one_shot && !image.decodes_in_calls) {
-        throw Failure(std::string("the ") + image.name + " decoder has only --mode oneshot so far");
+        throw Failure(std::string("the ") + image.name + " decoder has only --mode oneshot");
     }
     const Decoding decoding{input, image, description, options, session, box_for(options, description)};
     refuse_huge(decoding.box, *options.format);

@@ -7,6 +7,7 @@
 #include "tools/failure.h"
 #include "tools/png_decode.h"
 #include "tools/png_description.h"
+#include "tools/wbmp_description.h"
 
 namespace pelm_tool {
 namespace {
@@ -15,6 +16,9 @@ namespace {
 constexpr uint32_t common_formats = 1u << PELM_FORMAT_RGB565 | 1u << PELM_FORMAT_RGB888 | 1u << PELM_FORMAT_ARGB8888 |
                                     1u << PELM_FORMAT_RGB565_A8 | 1u << PELM_FORMAT_RGBA8888 |
                                     1u << PELM_FORMAT_BGRA8888;
+
+constexpr uint32_t wbmp_formats =
+    1u << PELM_FORMAT_RGB565 | 1u << PELM_FORMAT_RGB888 | 1u << PELM_FORMAT_RGBA8888 | 1u << PELM_FORMAT_BGRA8888;
 
 bool begins_with(Bytes head, const char *magic) {
     const size_t length = std::strlen(magic);
@@ -37,14 +41,39 @@ ImageDescription describe_png_input(Input &input) {
     return describe_png(*input.source());
 }
 
+ImageDescription describe_wbmp_input(Input &input) {
+    return describe_wbmp(input.head(), {input.size(), input.source()->kind});
+}
+
 int32_t decode_bmp(DecodeJob &job) {
     return ZOTARPELMI_DecodeBMP(&job.info, job.output(), job.box.width, job.box.height);
+}
+
+// The decoder knows no exact placement: the first run, without a picture, fits the image, and the second one gets a
+// buffer of just that size.
+int32_t decode_wbmp(DecodeJob &job) {
+    Box box = job.box;
+    job.info.flags &= PELM_PLACE_MASK; // any other bit keeps it from stretching
+    if (job.info.flags == PELM_PLACE_EXACT && job.picture != nullptr) {
+        box = {static_cast<int32_t>(job.picture->width), static_cast<int32_t>(job.picture->height)};
+        const bool keeps_size = box.width == job.image.width && box.height == job.image.height;
+        job.info.flags = keeps_size ? PELM_PLACE_FIT : PELM_PLACE_STRETCH;
+    }
+    return ZOTARPELMI_DecodeWBMP(&job.info, job.output(), box.width, box.height);
 }
 
 constexpr ImageFormat image_formats[] = {
     {"BMP", is_bmp, describe_bmp_input, decode_bmp, common_formats, false, false, false, false},
     {"PNG", begins_like_png, describe_png_input, decode_png, common_formats, true, true, true, true},
     {"GIF", is_gif, nullptr, nullptr, 0, false, false, false, false},
+    {.name = "WBMP",
+     .recognises = begins_like_wbmp,
+     .describe = describe_wbmp_input,
+     .decode = decode_wbmp,
+     .written_formats = wbmp_formats,
+     .never_turns = true,
+     .needs_seeks = true,
+     .black_is_clear = true},
 };
 
 } // namespace
@@ -56,7 +85,7 @@ const ImageFormat &recognise(Bytes head) {
         if (format.describe == nullptr) throw Failure(std::string(format.name) + " images are not decoded yet");
         return format;
     }
-    throw Failure("neither a BMP nor a PNG file (it begins like none of them)");
+    throw Failure("not a BMP, PNG or WBMP file (it begins like none of them)");
 }
 
 ImageDescription describe(const ImageFormat &image, Input &input) {

@@ -14,10 +14,13 @@ struct ImageFormat {
     ImageDescription (*describe)(Input &input); // nullptr: known, but not decoded
     int32_t (*decode)(DecodeJob &job);          // PELM_RESULT_
     uint32_t written_formats;                   // bit n: output format n
-    bool is_read_from_memory;                   // unless the user says otherwise
-    bool polls_rows;                            // asks the host once after every row
-    bool decodes_in_calls;                      // modes other than one-shot
-    bool turns_only_reduced;
+    bool is_read_from_memory = false;           // unless the user says otherwise
+    bool polls_rows = false;                    // asks the host once after every row
+    bool decodes_in_calls = false;              // modes other than one-shot
+    bool turns_only_reduced = false;
+    bool never_turns = false;
+    bool needs_seeks = false;    // from a pipe: its bytes are given as a stream that can seek
+    bool black_is_clear = false; // alpha 0, at the image's own size
 };
 
 // By the first bytes. Throws Failure, with the reason, for what cannot be decoded.

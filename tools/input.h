@@ -18,9 +18,9 @@ public:
     Input(const Input &) = delete;
     Input &operator=(const Input &) = delete;
 
-    // Where the choice was automatic: makes it a memory source, or leaves it the file or pipe that it is. Throws
-    // Failure.
-    void settle(bool in_memory);
+    // Where the choice was automatic: makes it a memory source, or leaves it the file or pipe that it is. The bytes of
+    // a pipe are given front to back, or with `needs_seeks` in any order. Throws Failure.
+    void settle(bool in_memory, bool needs_seeks);
 
     InputSource *source() { return is_viewed_ ? &view_ : &source_; }
     Bytes head() const { return head_; } // the first `described_bytes`, or the whole of a shorter file

@@ -101,7 +101,7 @@ Outcome Run::decode_one(const std::string &name, const OutputName *output) {
     Session session(options_, progress_);
     Input input(name, options_.source);
     const ImageFormat &format = recognise(input.head());
-    input.settle(format.is_read_from_memory);
+    input.settle(format.is_read_from_memory, format.needs_seeks);
     const ImageDescription image = describe(format, input);
     session.throw_if_stopped();
     if (output == nullptr) return describe_one(name, image);

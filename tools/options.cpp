@@ -16,13 +16,14 @@ constexpr const char *description = "Decodes images with the Pelm image decoder 
                                     "raw pixels.";
 
 constexpr const char *remarks = R"(
-Inputs: BMP and PNG files; "-" is standard input. With several inputs OUTPUT is a folder, or has %n (1, 2, ...) or %f
-(the input's name without folder and suffix) in it. "%%" is a percent sign. OUTPUT "-" is standard output.
+Inputs: BMP, PNG and WBMP files; "-" is standard input. With several inputs OUTPUT is a folder, or has %n (1, 2, ...)
+or %f (the input's name without folder and suffix) in it. "%%" is a percent sign. OUTPUT "-" is standard output.
 
 Sources: a PNG is decoded from memory. A BMP is read as a seekable file when it is a named one, as a pipe otherwise. A
 pipe is first read to its end into memory, then decoded front to back. The decoder takes the rows of a BMP pipe from
 right behind the headers, whatever the header says, and writes those of a top-down BMP upwards: use --source memory
-for such files. From file or pipe some PNGs cannot be decoded (a chunk begins across the decoder's buffer).
+for such files. From file or pipe some PNGs cannot be decoded (a chunk begins across the decoder's buffer). A WBMP is
+read as a seekable file, also with --source pipe, or from memory when it comes through a pipe.
 
 Modes (PNG): oneshot decodes in one call, iter block by block, line=N by calls for N rows each; the picture is the
 same. iter turns to oneshot when the first block brings no row, and to line=16 for grey of 8 bits that is reduced.
@@ -33,13 +34,15 @@ Placement: fit reduces the image to the box (it never enlarges), keeps its shape
 box. exact reduces as fit does; the output is just the image. With exact and a quarter turn the decoder does not
 swap width and height of the output, and what lies outside is cut off. A PNG is turned only when it is reduced or
 stretched, and never when it is grey of 8 bits; reduced, that kind fills only a part of its place. In rgb565 a turn by
-270 degrees shifts a PNG that is not square. The decoder does so; the tool warns of the first two.
+270 degrees shifts a PNG that is not square. The decoder does so; the tool warns of the first two. A WBMP cannot be
+turned. Its odd margins have their larger half left and above.
 
 Background: what the image does not cover is black and, in formats with alpha, transparent; with --background it is
 opaque in that colour. In rgb565 and rgb, which have no alpha, a PNG with transparency lies over it.
 
 Formats: bgr565, bgr and bgrx exist for GIF only. A BMP that is reduced or stretched has red and blue exchanged in
-rgb565a: the decoder writes it so.
+rgb565a: the decoder writes it so. WBMP has rgb565, rgb, rgba and bgra; at its own size black is transparent in the
+last two (the tool warns), reduced or stretched white is 252 of 255.
 
 Exit status: 0 done; 1 failed, no output; 2 done, but pixels are missing. With several inputs the
 worst: 1, then 2, then 0.)";

@@ -1,5 +1,5 @@
-// Photos and drawings by others, stored as BMP in every accepted way. They lie outside of the repository: where they
-// are missing, the tests say so and pass.
+// Photos and drawings by others, as WBMP, and stored as BMP in every accepted way. They lie outside of the repository:
+// where they are missing, the tests say so and pass.
 #include "tests/tool/run_tool.h"
 #include "tests/tool/stored_pixels.h"
 
@@ -110,6 +110,16 @@ TEST_F(ToolPhotos, keep_their_colours_at_24_bits) {
     const std::string bmp = write("photo.bmp", as_bmp(photo, variant_named("twenty_four_bits"), false));
     ASSERT_EQ(run({bmp, "-o", path("photo.png")}).status, 0);
     EXPECT_EQ(difference(photo, read_png(path("photo.png"))), "");
+}
+
+TEST_F(ToolPhotos, that_are_wbmps_decode_to_their_stored_pixels) {
+    for (const std::string name : {"bricks-nodither.wbmp", "hat.wbmp", "muybridge-frame-000.wbmp"}) {
+        if (!is_there(name)) continue;
+        const std::string file = (image_folder() / name).string();
+        const ToolRun got = run({file, "--format", "rgb", "-o", path("photo.png")});
+        EXPECT_EQ(got.status, 0) << got.err;
+        EXPECT_EQ(difference(stored_wbmp_image(read_file(file)), read_png(path("photo.png"))), "") << name;
+    }
 }
 
 TEST_F(ToolPhotos, with_long_headers_are_refused_in_one_line) {

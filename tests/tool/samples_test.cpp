@@ -32,8 +32,10 @@ Image through_565(const Image &image) {
 TEST_F(ToolSamples, are_what_the_generator_draws) {
     ASSERT_EQ(shell(std::string(PELM_DRAW_SAMPLES) + " '" + path("") + "'").status, 0);
     std::vector<std::filesystem::path> samples = bmp_samples();
-    const auto pngs = files_with_suffix(PELM_SAMPLES, ".png");
-    samples.insert(samples.end(), pngs.begin(), pngs.end());
+    for (const char *const suffix : {".png", ".wbmp"}) {
+        const auto others = files_with_suffix(PELM_SAMPLES, suffix);
+        samples.insert(samples.end(), others.begin(), others.end());
+    }
     ASSERT_EQ(files().size(), samples.size());
     for (const auto &file : samples)
         EXPECT_TRUE(read_file(path(file.filename().string())) == read_file(file)) << file;

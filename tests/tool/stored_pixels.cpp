@@ -62,4 +62,23 @@ Image stored_image(const Bytes &bmp) {
     return image;
 }
 
+Image stored_wbmp_image(const Bytes &wbmp) {
+    size_t at = 2;
+    const auto integer = [&] {
+        size_t value = 0;
+        do
+            value = value * 128 + wbmp[at] % 128;
+        while (wbmp[at++] >= 128);
+        return value;
+    };
+    const size_t width = integer();
+    Image image{width, integer(), {}, false};
+    const size_t stride = (image.width + 7) / 8;
+    for (size_t y = 0; y < image.height; ++y) {
+        for (size_t x = 0; x < image.width; ++x)
+            image.pixels.push_back((wbmp[at + y * stride + x / 8] >> (7 - x % 8) & 1) != 0 ? 0xFFFFFFFF : 0x000000FF);
+    }
+    return image;
+}
+
 } // namespace pelm::test
