@@ -13,17 +13,29 @@ constexpr int32_t palette_entry_bytes = 4;
 // Every index finds an entry, however few the file brings: pixels are not checked against their number.
 constexpr int32_t smallest_palette = 256 * palette_entry_bytes;
 
-// Required: the size comes from the place of the pixel array, never from the header's colour count, and a 16-bit entry
-// count above 32767 is negative (docs/oddities.md, "Palettes").
-int32_t palette_bytes(uint32_t pixel_data_offset) {
-    constexpr int32_t default_entries = 13;
-    if (pixel_data_offset <= bmp_header_bytes) return default_entries * palette_entry_bytes;
-    const auto entries = static_cast<int16_t>((pixel_data_offset - bmp_header_bytes) >> 2 & 0xFFFF);
-    return entries * palette_entry_bytes;
+constexpr int32_t palette_bytes(int32_t entries) {
+    return static_cast<int16_t>(entries) * palette_entry_bytes;
 }
 
-SetUp read_palette(BmpState &state, const BmpHeader &header, InputSource &input) {
-    const int32_t bytes = palette_bytes(header.pixel_data_offset);
+// Required: the size comes from the place of the pixel array, never from the header's colour count, and a 16-bit entry
+// count above 32767 is negative (docs/oddities.md, "Palettes"). In two steps there is no default, and the count is
+// rounded towards zero (docs/oddities.md, "Headers in two steps").
+int32_t palette_bytes(uint32_t pixel_data_offset, Calls calls) {
+    constexpr uint32_t palette_start = bmp_header_bytes;
+    constexpr int32_t default_entries = 13;
+    const uint32_t room = pixel_data_offset - palette_start;
+    if (calls == Calls::two_step) return palette_bytes(static_cast<int32_t>(room) / palette_entry_bytes);
+    return palette_bytes(pixel_data_offset <= palette_start ? default_entries : static_cast<int32_t>(room >> 2));
+}
+
+// `count` bytes of a memory source as far as it has them; the rest of `bytes` stays as it is.
+void copy_as_far_as_there(const InputSource &input, int32_t offset, uint8_t *bytes, int32_t count) {
+    const int32_t there = std::min(count, std::max(input.size, offset) - offset);
+    if (there > 0) ZOTARPELM_OsMemcpy(bytes, input.data + offset, static_cast<uint32_t>(there));
+}
+
+SetUp read_palette(BmpState &state, const BmpHeader &header, InputSource &input, Calls calls) {
+    const int32_t bytes = palette_bytes(header.pixel_data_offset, calls);
     if (bytes < 0) return SetUp::refused;
     const auto block = static_cast<uint32_t>(std::max(bytes, smallest_palette));
     state.palette = allocate_array<uint8_t>(block);
@@ -32,12 +44,12 @@ SetUp read_palette(BmpState &state, const BmpHeader &header, InputSource &input)
     if (bytes == 0) return SetUp::done;
 
     if (input.kind == PELM_SOURCE_MEMORY) {
-        const int32_t there = std::min(bytes, input.size - bmp_header_bytes);
-        if (there > 0) ZOTARPELM_OsMemcpy(state.palette, input.data + bmp_header_bytes, static_cast<uint32_t>(there));
+        copy_as_far_as_there(input, bmp_header_bytes, state.palette, bytes);
         return SetUp::done;
     }
+    const int32_t got = ZOTARPELM_Read_IO(&input, state.palette, bytes);
     // Required: a short palette leaves the record and the palette allocated (docs/oddities.md, "Refusals that leak").
-    return ZOTARPELM_Read_IO(&input, state.palette, bytes) < bytes ? SetUp::abandoned : SetUp::done;
+    return got < bytes && calls == Calls::direct ? SetUp::abandoned : SetUp::done;
 }
 
 struct Masks {
@@ -61,24 +73,24 @@ void use_masks(BmpState &state, const Masks &masks) {
     state.blueShift = masks.blue_shift;
 }
 
-SetUp read_mask(InputSource &input, int32_t offset, uint32_t &mask) {
-    uint8_t bytes[4];
+SetUp read_mask(InputSource &input, int32_t offset, uint32_t &mask, Calls calls) {
+    uint8_t bytes[4] = {};
     if (input.kind == PELM_SOURCE_MEMORY) {
-        if (input.size < offset + 4) return SetUp::refused;
-        mask = read_u32le(input.data + offset);
-        return SetUp::done;
+        if (input.size < offset + 4 && calls == Calls::direct) return SetUp::refused;
+        copy_as_far_as_there(input, offset, bytes, 4);
+    } else if (ZOTARPELM_Read_IO(&input, bytes, 4) < 4 && calls == Calls::direct) {
+        // Required: short masks leave the record allocated (docs/oddities.md, "Refusals that leak").
+        return SetUp::abandoned;
     }
-    // Required: short masks leave the record allocated (docs/oddities.md, "Refusals that leak").
-    if (ZOTARPELM_Read_IO(&input, bytes, 4) < 4) return SetUp::abandoned;
     mask = read_u32le(bytes);
     return SetUp::done;
 }
 
-SetUp read_masks(BmpState &state, InputSource &input) {
+SetUp read_masks(BmpState &state, InputSource &input, Calls calls) {
     uint32_t masks[3] = {};
     int32_t offset = bmp_header_bytes;
     for (uint32_t &mask : masks) {
-        const SetUp got = read_mask(input, offset, mask);
+        const SetUp got = read_mask(input, offset, mask, calls);
         if (got != SetUp::done) return got;
         offset += 4;
     }
@@ -92,11 +104,11 @@ SetUp read_masks(BmpState &state, InputSource &input) {
 
 } // namespace
 
-SetUp read_colours(BmpState &state, const BmpHeader &header, InputSource &input) {
+SetUp read_colours(BmpState &state, const BmpHeader &header, InputSource &input, Calls calls) {
     switch (header.bits_per_pixel) {
     case 1:
     case 4:
-    case 8: return read_palette(state, header, input);
+    case 8: return read_palette(state, header, input, calls);
     case 16: break;
     default: return SetUp::done;
     }
@@ -104,7 +116,7 @@ SetUp read_colours(BmpState &state, const BmpHeader &header, InputSource &input)
         use_masks(state, masks_555);
         return SetUp::done;
     }
-    return read_masks(state, input);
+    return read_masks(state, input, calls);
 }
 
 } // namespace pelm

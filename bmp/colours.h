@@ -7,7 +7,7 @@
 namespace pelm {
 
 // Reads what stands between the header and the pixels, by the header's bit count, compression and pixel offset, into
-// the record. Streams must stand behind the 54 header bytes.
-SetUp read_colours(BmpState &state, const BmpHeader &header, InputSource &input);
+// the record. Streams must stand behind the 54 header bytes. In two steps what does not arrive counts as zeros.
+SetUp read_colours(BmpState &state, const BmpHeader &header, InputSource &input, Calls calls);
 
 } // namespace pelm

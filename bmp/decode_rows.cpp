@@ -13,20 +13,12 @@ OutputRows output_rows(const BmpState &state, intptr_t cursor, int32_t count) {
     return {cursor, state.input->kind == PELM_SOURCE_SEQUENTIAL ? step : -step, pixel_step};
 }
 
-namespace {
-
 int32_t last_file_row(const BmpState &state, Band band) {
     if (state.oneToOne != 0) return first_file_row(state, band) + band.count - 1;
     const SamplePoints points = quarter_points(state.height);
     if (state.topDown != 0)
         return sampled_at(band.first + band.count - 1, points.second, state.height, state.scaledHeight);
     return state.height - 1 - sampled_at(band.first, points.first, state.height, state.scaledHeight);
-}
-
-} // namespace
-
-int32_t pass_over_rows(const BmpState &state, Band band, RowReader &reader) {
-    return read_row(reader, last_file_row(state, band)) != nullptr ? PELM_RESULT_DONE : reader.result;
 }
 
 int32_t first_file_row(const BmpState &state, Band band) {

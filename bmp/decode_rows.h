@@ -1,5 +1,6 @@
 // The row decoder that all depths share: where a band's rows lie in the file and in the output, and the two ways to
-// write them, pixel for pixel and scaled.
+// write them, pixel for pixel and scaled. Rows come from a reader: plain ones (bmp/row_reader.h) or expanded codes
+// (bmp/run_length.h).
 #pragma once
 
 #include <algorithm>
@@ -26,15 +27,16 @@ struct OutputRows {
 
 OutputRows output_rows(const BmpState &state, intptr_t cursor, int32_t count);
 
-// The first stored row that a band needs, counted in the file.
+// The first and the last stored row that a band needs, counted in the file.
 int32_t first_file_row(const BmpState &state, Band band);
+int32_t last_file_row(const BmpState &state, Band band);
 
 inline void advance(OutputRows &rows) {
     rows.position += rows.row_step;
 }
 
-template <class Load>
-int32_t copy_rows(const BmpState &state, Band band, RowReader &reader, OutputRows to, Load load) {
+template <class Reader, class Load>
+int32_t copy_rows(const BmpState &state, Band band, Reader &reader, OutputRows to, Load load) {
     const int32_t first = first_file_row(state, band);
     for (int32_t i = 0; i < band.count; ++i) {
         load.row = read_row(reader, first + i);
@@ -59,8 +61,8 @@ void add_sample_line(const Load &load, uint32_t *sums, int32_t width, int32_t sc
 }
 
 // Scans the band's sample lines in the order in which their rows are stored; rows without one are passed over.
-template <class Load>
-int32_t reduce_rows(const BmpState &state, Band band, RowReader &reader, OutputRows to, Load load) {
+template <class Reader, class Load>
+int32_t reduce_rows(const BmpState &state, Band band, Reader &reader, OutputRows to, Load load) {
     const bool downwards = state.topDown != 0;
     const SamplePoints points = quarter_points(state.height);
     const int64_t lines[2] = {downwards ? points.first : points.second, downwards ? points.second : points.first};
@@ -85,17 +87,19 @@ int32_t reduce_rows(const BmpState &state, Band band, RowReader &reader, OutputR
 }
 
 // Where nothing can be written the rows are only read, as far as the band needs them.
-int32_t pass_over_rows(const BmpState &state, Band band, RowReader &reader);
+template <class Reader>
+int32_t pass_over_rows(const BmpState &state, Band band, Reader &reader) {
+    return read_row(reader, last_file_row(state, band)) != nullptr ? PELM_RESULT_DONE : reader.result;
+}
 
-// Decodes `rows` output rows from `state.rowsDone` on. `load` is the layout; its row is filled in here. Nothing is
-// decoded of a record whose rows are laid out otherwise.
-template <class Load>
-int32_t decode_rows(const BmpState &state, intptr_t cursor, int32_t rows, const Load &load) {
+// Decodes `rows` output rows from `state.rowsDone` on. `load` is the layout of the rows that the reader gives; its row
+// is filled in here.
+template <class Reader, class Load>
+int32_t decode_rows_from(const BmpState &state, intptr_t cursor, int32_t rows, const Load &load) {
     const Band band = {state.rowsDone, std::min(rows, state.scaledHeight - state.rowsDone)};
-    if (state.bitsPerPixel != Load::bits) return PELM_RESULT_DONE;
     if (band.count <= 0 || state.scaledWidth <= 0 || state.height == 0) return PELM_RESULT_DONE;
 
-    RowReader reader;
+    Reader reader;
     int32_t result = PELM_RESULT_FAILED;
     if (open_rows(reader, state, first_file_row(state, band))) {
         const OutputRows to = output_rows(state, cursor, band.count);
@@ -108,6 +112,13 @@ int32_t decode_rows(const BmpState &state, intptr_t cursor, int32_t rows, const 
     }
     close_rows(reader);
     return result;
+}
+
+// The same for plain rows. Nothing is decoded of a record whose rows are laid out otherwise.
+template <class Load>
+int32_t decode_rows(const BmpState &state, intptr_t cursor, int32_t rows, const Load &load) {
+    if (state.bitsPerPixel != Load::bits) return PELM_RESULT_DONE;
+    return decode_rows_from<RowReader>(state, cursor, rows, load);
 }
 
 } // namespace pelm

@@ -1,5 +1,6 @@
 // The depths with a palette: 1, 4 and 8 bits per pixel.
 #include "bmp/decode_rows.h"
+#include "bmp/run_length.h"
 #include "bmp/working.h"
 
 using namespace pelm;
@@ -13,6 +14,14 @@ void write_indexed(const uint8_t *row, void *output, int32_t count, int32_t pixe
                  static_cast<ptrdiff_t>(pixel_step) * pixel_step_unit(format));
 }
 
+// Expanded codes are rows of 8 bits at either depth.
+template <int32_t depth>
+int32_t decode_indexed(const BmpState &state, intptr_t cursor, int32_t rows) {
+    if (state.bitsPerPixel == depth && is_run_length(state))
+        return decode_rows_from<RunLengthReader>(state, cursor, rows, IndexedRow<8>{nullptr, state.palette});
+    return decode_rows(state, cursor, rows, IndexedRow<depth>{nullptr, state.palette});
+}
+
 } // namespace
 
 int32_t PELMI_BMP_Decode1bitBMP(BmpState *state, intptr_t outputCursor, int32_t rows) {
@@ -20,11 +29,11 @@ int32_t PELMI_BMP_Decode1bitBMP(BmpState *state, intptr_t outputCursor, int32_t 
 }
 
 int32_t PELMI_BMP_Decode4bitBMP(BmpState *state, intptr_t outputCursor, int32_t rows) {
-    return decode_rows(*state, outputCursor, rows, IndexedRow<4>{nullptr, state->palette});
+    return decode_indexed<4>(*state, outputCursor, rows);
 }
 
 int32_t PELMI_BMP_Decode8bitBMP(BmpState *state, intptr_t outputCursor, int32_t rows) {
-    return decode_rows(*state, outputCursor, rows, IndexedRow<8>{nullptr, state->palette});
+    return decode_indexed<8>(*state, outputCursor, rows);
 }
 
 BmpStop PELMI_BMP_Write1bitOutput(const uint8_t *row, void *output, int32_t count, int32_t pixelStep,

@@ -1,10 +1,7 @@
 #include "bmp/row_reader.h"
 
-#include <algorithm>
-#include <limits>
-
 #include "bmp/header.h"
-#include "frame/memory.h"
+#include "frame/host.h"
 
 namespace pelm {
 namespace {
@@ -26,17 +23,17 @@ const uint8_t *row_in_memory(RowReader &reader, int32_t index) {
 
 // Reads on until a whole row is held. What a row does not fill when the data ends is dropped.
 bool hold_a_row(RowReader &reader) {
+    uint8_t *const buffer = reader.staging.bytes;
     while (reader.held < reader.stride) {
         if (reader.start != 0 && reader.held != 0)
-            ZOTARPELM_OsMemcpy(reader.buffer, reader.buffer + reader.start, static_cast<uint32_t>(reader.held));
+            ZOTARPELM_OsMemcpy(buffer, buffer + reader.start, static_cast<uint32_t>(reader.held));
         reader.start = 0;
-        const int32_t room = reader.capacity - reader.held;
-        const int32_t got = ZOTARPELM_Read_IO(reader.input, reader.buffer + reader.held, room);
-        if (got < 1) {
-            reader.result = reader.input->consumed == reader.input->size ? PELM_RESULT_DONE : PELM_RESULT_DATA_ENDED;
+        const int32_t got = fill_staging(reader.staging, reader.held);
+        if (got == 0) {
+            reader.result = reader.staging.result;
             return false;
         }
-        reader.held += std::min(got, room);
+        reader.held += got;
     }
     return true;
 }
@@ -49,7 +46,7 @@ const uint8_t *row_in_stream(RowReader &reader, int32_t index) {
             reader.row = nullptr;
         }
         if (!hold_a_row(reader)) return nullptr;
-        reader.row = reader.buffer + reader.start;
+        reader.row = reader.staging.bytes + reader.start;
         ++reader.current;
     }
     return reader.row;
@@ -63,24 +60,6 @@ void set_limits(RowReader &reader, const BmpState &state) {
     reader.bytes_behind = padded ? 0 : 2;
 }
 
-void open_seekable(RowReader &reader, int32_t first) {
-    // A place that the position's 32 bits cannot name lies behind the end of any stream.
-    constexpr int64_t farthest = std::numeric_limits<int32_t>::max();
-    const int64_t offset = std::min(offset_of(reader, first), farthest);
-    ZOTARPELM_Seek_IO(reader.input, static_cast<int32_t>(offset), 0);
-    reader.capacity = reader.input->bufferSize;
-    reader.buffer = reader.input->data;
-}
-
-bool open_sequential(RowReader &reader, const BmpState &state) {
-    // The first rows of a top-down image may hold no sample, but they are what the stream delivers first.
-    if (state.topDown != 0 && state.rowsDone == 0) reader.current = -1;
-    reader.capacity = std::max(reader.input->bufferSize, reader.stride);
-    reader.buffer = allocate_array<uint8_t>(static_cast<uint32_t>(reader.capacity));
-    reader.owns_buffer = true;
-    return reader.buffer != nullptr;
-}
-
 } // namespace
 
 bool open_rows(RowReader &reader, const BmpState &state, int32_t first) {
@@ -89,11 +68,13 @@ bool open_rows(RowReader &reader, const BmpState &state, int32_t first) {
     reader.stride = row_stride(state.width, state.bitsPerPixel);
     reader.current = first - 1;
     reader.first_row_offset = state.pixelDataOffset;
-    switch (state.input->kind) {
-    case PELM_SOURCE_MEMORY: set_limits(reader, state); return true;
-    case PELM_SOURCE_SEQUENTIAL: return open_sequential(reader, state);
-    default: open_seekable(reader, first); return true;
+    if (state.input->kind == PELM_SOURCE_MEMORY) {
+        set_limits(reader, state);
+        return true;
     }
+    // The first rows of a top-down image may hold no sample, but they are what a sequential stream delivers first.
+    if (state.input->kind == PELM_SOURCE_SEQUENTIAL && state.topDown != 0 && state.rowsDone == 0) reader.current = -1;
+    return open_staging(reader.staging, state, offset_of(reader, first));
 }
 
 const uint8_t *read_row(RowReader &reader, int32_t index) {
@@ -102,7 +83,7 @@ const uint8_t *read_row(RowReader &reader, int32_t index) {
 }
 
 void close_rows(RowReader &reader) {
-    if (reader.owns_buffer) free_block(reader.buffer);
+    close_staging(reader.staging);
 }
 
 } // namespace pelm

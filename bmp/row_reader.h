@@ -1,8 +1,8 @@
-// Stored rows in file order, one at a time, from memory in place or from a stream through a buffer. What a row's bytes
-// mean is the caller's business.
+// Plainly stored rows in file order, one at a time, from memory in place or from a stream through a buffer. What a
+// row's bytes mean is the caller's business.
 #pragma once
 
-#include "bmp/state.h"
+#include "bmp/staging.h"
 
 namespace pelm {
 
@@ -18,12 +18,10 @@ struct RowReader {
     int32_t bytes_needed; // of each row
     int32_t bytes_behind; // that must follow the first byte of each row
 
-    // Streams: `held` bytes at `buffer` + `start`, the current row among them.
-    uint8_t *buffer;
-    int32_t capacity;
+    // Streams: `held` bytes from `start` on in the staging buffer, the current row among them.
+    Staging staging;
     int32_t start;
     int32_t held;
-    bool owns_buffer;
 };
 
 // Starts in front of file row `first`. Streams are positioned there; a sequential one is read from where it stands.

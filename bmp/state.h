@@ -12,7 +12,7 @@ struct BmpState {
     int32_t height; // absolute; may be 0
     uint16_t bitsPerPixel;
     uint32_t pixelDataOffset; // file offset of the pixel array, as the header says
-    uint32_t compression;     // 0: rows are stored plainly
+    uint32_t compression;     // 1 or 2: rows are run-length codes where the depth is 8 or 4; set in two steps only
     uint8_t *palette;         // blue, green, red, reserved; at least 256 entries, or NULL above 8 bits per pixel
     uint32_t redMask;         // 16 bits per pixel: the colour's bits in a pixel ...
     uint32_t greenMask;
@@ -22,16 +22,16 @@ struct BmpState {
     uint32_t blueShift;
     int32_t scaledWidth; // image in the output, in the image's own orientation
     int32_t scaledHeight;
-    uint32_t *accumulators; // 2 rows of scaledWidth words, or NULL when scaledWidth is not above 0
-    uint32_t oneToOne;      // 1: written pixel for pixel
-    int32_t requestedWidth; // the box width of the call
-    int32_t reserved17;
-    int32_t rotation;      // clockwise degrees: 0, 90, 180 or 270
-    int32_t rowStep;       // bytes from an image row to the next one in the output; negated for top-down files
-    int32_t pixelStep;     // from an image pixel to the next one: in pixels for RGB565, otherwise in bytes
-    uint32_t topDown;      // 1: the first stored row is the top one
-    intptr_t outputCursor; // byte offset, from the start of the output buffer, of the first pixel of the first image
-                           // row of the band. An offset, for it may lie outside the buffer
+    uint32_t *accumulators;  // 2 rows of scaledWidth words, or NULL when scaledWidth is not above 0
+    uint32_t oneToOne;       // 1: written pixel for pixel
+    int32_t requestedWidth;  // the box width of the call; while parked the height over the sample divisor
+    int32_t requestedHeight; // the box height; in two steps only
+    int32_t rotation;        // clockwise degrees: 0, 90, 180 or 270
+    int32_t rowStep;         // bytes from an image row to the next one in the output; negated for top-down files
+    int32_t pixelStep;       // from an image pixel to the next one: in pixels for RGB565, otherwise in bytes
+    uint32_t topDown;        // 1: the first stored row is the top one
+    intptr_t outputCursor;   // byte offset, from the start of the output buffer, of the first pixel of the first image
+                             // row of the band. An offset, for it may lie outside the buffer
     InputSource *input;
     uint32_t outputFormat;
     int32_t rowsDone; // output rows of earlier bands
@@ -54,7 +54,7 @@ static_assert(pelm::lies_on_word(offsetof(BmpState, scaledHeight), 13));
 static_assert(pelm::lies_on_word(offsetof(BmpState, accumulators), 14));
 static_assert(pelm::lies_on_word(offsetof(BmpState, oneToOne), 15));
 static_assert(pelm::lies_on_word(offsetof(BmpState, requestedWidth), 16));
-static_assert(pelm::lies_on_word(offsetof(BmpState, reserved17), 17));
+static_assert(pelm::lies_on_word(offsetof(BmpState, requestedHeight), 17));
 static_assert(pelm::lies_on_word(offsetof(BmpState, rotation), 18));
 static_assert(pelm::lies_on_word(offsetof(BmpState, rowStep), 19));
 static_assert(pelm::lies_on_word(offsetof(BmpState, pixelStep), 20));

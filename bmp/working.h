@@ -11,6 +11,11 @@
 // buffers, and sets outputWidth, outputHeight, decodeStarted and decoderState of the request. NULL when refused.
 PELM_EXPORT BmpState *PELMI_BMP_Initialize(ImageDecodeInfo *info, int32_t outWidth, int32_t outHeight, void *output);
 
+// The same for the record that ZOTARPELMI_PreInitBMP has parked in decoderState, with the rules of the calls in two
+// steps. Refused: the record is freed as below, and decoderState still points at it. NULL too without a record.
+PELM_EXPORT BmpState *PELMI_BMP_InitializeSKIA(ImageDecodeInfo *info, int32_t outWidth, int32_t outHeight,
+                                               void *output);
+
 // Frees the staging buffer (kinds 0 and 2, whose `data` becomes NULL), the palette, the accumulators and the record.
 PELM_EXPORT void PELMI_BMP_DeleteDecInfo(BmpState *state);
 

@@ -2,7 +2,6 @@
 // image in a buffer of its unturned size has, is rounded down too.
 #include "frame/placement.h"
 
-#include <algorithm>
 #include <cstdlib>
 #include <limits>
 
@@ -22,12 +21,11 @@ Placement place(int32_t rotation, Size buffer, Size scaled) {
 }
 
 bool place_bytes(int32_t rotation, Size buffer, Size scaled, int32_t pixel_bytes, BytePlacement &placement) {
-    constexpr int64_t farthest = std::min<int64_t>(std::numeric_limits<intptr_t>::max(), int64_t{1} << 62);
     const Placement pixels = place(rotation, buffer, scaled);
     const int64_t row_step = pixels.row_step * pixel_bytes;
     const int64_t pixel_step = pixels.pixel_step * pixel_bytes;
     constexpr int64_t longest_step = std::numeric_limits<int32_t>::max(); // either way: steps can be turned round
-    if (std::abs(pixels.first) > farthest / pixel_bytes || std::abs(row_step) > longest_step ||
+    if (std::abs(pixels.first) > farthest_position / pixel_bytes || std::abs(row_step) > longest_step ||
         std::abs(pixel_step) > longest_step)
         return false;
     placement = {static_cast<intptr_t>(pixels.first * pixel_bytes), static_cast<int32_t>(row_step),

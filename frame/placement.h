@@ -2,7 +2,9 @@
 // from there.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
+#include <limits>
 
 #include "PelmImageDecoder.h"
 
@@ -41,7 +43,11 @@ struct BytePlacement {
     int32_t row_step, pixel_step;
 };
 
-// False when it does not fit that record. The walk over all rows stays in range from there, in 64 bits.
+// How far from the buffer's start, either way, a first pixel may lie: the walk over all rows stays in range from there,
+// in 64 bits.
+constexpr int64_t farthest_position = std::min<int64_t>(std::numeric_limits<intptr_t>::max(), int64_t{1} << 62);
+
+// False when it does not fit that record, or lies too far.
 bool place_bytes(int32_t rotation, Size buffer, Size scaled, int32_t pixel_bytes, BytePlacement &placement);
 
 } // namespace pelm

@@ -81,14 +81,16 @@ enum {
 typedef struct InputSource {
     uint32_t kind;     /* PELM_SOURCE_ */
     uint8_t *data;     /* kind 1: the caller's bytes. Kinds 0 and 2: a staging buffer that the library allocates
-                          and frees; the caller neither sets nor frees it (WBMP, kind 0: NULL after every call) */
+                          and frees; the caller neither sets nor frees it, except for ZOTARPELMI_DecodeBMPSKIA (WBMP,
+                          kind 0: NULL after every call) */
     void *hostContext; /* the host services' own */
     int32_t size;      /* bytes at `data` (kind 1), or in the whole stream */
     int32_t consumed; /* bytes delivered so far, written by the host services (and PNG). A read that gives nothing while
                          consumed == size is an end of data, otherwise a failed read */
     int32_t hostPosition; /* the host services' own */
     int32_t bufferSize;   /* kinds 0, 2 and 4: proposed size of the buffer for row reads, in bytes. BMP rounds it
-                             down to whole rows, or up to one, and writes it back (kinds 0 and 2) */
+                             down to whole rows, or up to one, and writes it back (kinds 0 and 2); with a caller's
+                             buffer it uses whole rows, and the word stays */
 } InputSource;
 
 /*
@@ -101,7 +103,7 @@ typedef struct ImageDecodeInfo {
     uint32_t flags;        /* PELM_ROTATE_ | PELM_PLACE_ | PELM_INTERLACE_FRAME */
     uint32_t reserved3;
     uint32_t reserved4;
-    int32_t imageWidth; /* stored image, in pixels */
+    int32_t imageWidth; /* stored image, in pixels: ZOTARPELMI_PreInitBMP tells it */
     int32_t imageHeight;
     int32_t outputWidth; /* image after scaling, in pixels, measured in the image's own orientation */
     int32_t outputHeight;
@@ -134,6 +136,53 @@ typedef struct ImageDecodeInfo {
  * `decoderState` is NULL; or PELM_RESULT_FAILED, and then it is as it was.
  */
 PELM_API int32_t ZOTARPELMI_DecodeBMP(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight);
+
+/*
+ * The same in bands of rows, all into the buffer of the first call: pass the same request, buffer and box each time.
+ * `output` counts in the first call only. With kind 4 only the first band is what it should be: buffer such a source,
+ * or decode it in one call.
+ *
+ * IterLine: the next `rows` rows of the scaled image, or as many as remain. Keep `rows` the same until the end: each
+ * later band is placed by its own height, as if all before had been as high. 0 or fewer rows decode nothing.
+ * PELM_RESULT_DONE, and then `decoderState` is NULL when the image is complete; or PELM_RESULT_FAILED.
+ *
+ * Iter: the next 100 rows. PELM_RESULT_MORE while rows remain, then PELM_RESULT_DONE; or PELM_RESULT_FAILED.
+ */
+PELM_API int32_t ZOTARPELMI_DecodeBMPIterLine(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight,
+                                              int32_t rows);
+PELM_API int32_t ZOTARPELMI_DecodeBMPIter(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight);
+
+/* Forgets a decode in progress by setting `decoderState` to NULL, and FREES NOTHING: finish the decode instead, or call
+ * PELMI_BMP_DestroyBMP before, which frees a part. Returns 1, or 0 for a NULL `info`. */
+PELM_API int32_t ZOTARPELMI_AbortBMPIter(ImageDecodeInfo *info);
+
+/*
+ * The same in bands, each into a buffer of its own: `output` has outWidth x `rows` pixels (fewer rows when fewer
+ * remain), and the band begins in its first row, centred horizontally only. Never turned; of the placements only
+ * PELM_PLACE_STRETCH counts. `rows` may differ from call to call; 0 or fewer decode nothing.
+ * PELM_RESULT_DONE, or PELM_RESULT_DATA_ENDED when a read failed before the band was complete; and then `decoderState`
+ * is NULL when the image is complete. PELM_RESULT_FAILED for what is refused and without memory.
+ */
+PELM_API int32_t ZOTARPELMI_DecodeBMPLine(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight,
+                                          int32_t rows);
+
+/*
+ * The same in two steps, for graphics libraries that choose a divisor and a buffer once they know the size. These calls
+ * know RLE8 and RLE4, take every header for one of 40 bytes, and refuse files that are too short for their rows.
+ *
+ * PreInit reads the header and sets imageWidth, imageHeight, and outputWidth and outputHeight: the same over
+ * `sampleDivisor`, the height negative for a top-down file. PELM_RESULT_DONE, and `decoderState` holds a record for
+ * DecodeBMPSKIA, or for PELMI_BMP_DestroyBMP when there will be no decode, and for no other call; or
+ * PELM_RESULT_FAILED (a divisor of 0 too), and `decoderState` is as it was.
+ *
+ * DecodeBMPSKIA decodes into the box, which need not be what PreInit proposed. Leave the source where PreInit left it.
+ * Kinds 0 and 2 need a staging buffer before the call: `data` from ZOTARPELM_OsMalloc, of `bufferSize` bytes, at least
+ * a stored row. It BELONGS TO THE LIBRARY once the call has begun: it is freed, and `data` is NULL, when the call
+ * returns. PELM_RESULT_DONE, and `decoderState` is NULL; or PELM_RESULT_FAILED, and then the record is freed and
+ * `decoderState` STILL POINTS AT IT: set it to NULL before the request is used again, and never pass it on.
+ */
+PELM_API int32_t ZOTARPELMI_PreInitBMP(ImageDecodeInfo *info, int32_t sampleDivisor);
+PELM_API int32_t ZOTARPELMI_DecodeBMPSKIA(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight);
 
 /* Frees the BMP state record that a decode in progress left in `decoderState`, and its palette; nothing else that
  * hangs from it. Returns 1, or 0 for a NULL `info`. */

@@ -86,6 +86,22 @@ std::array<uint8_t, 4> packed_pixel(Rgb color, uint32_t format, bool blue_first)
     }
 }
 
+std::vector<BmpBand> bands_of(int64_t scaled_height, const std::vector<int32_t> &rows) {
+    std::vector<BmpBand> bands;
+    int64_t done = 0;
+    int64_t at = 0;
+    bool begun = false;
+    for (const int32_t asked : rows) {
+        if (begun && asked > 0) at += asked;
+        begun = true;
+        const int64_t count = std::min<int64_t>(asked, scaled_height - done);
+        if (count <= 0) continue;
+        bands.push_back({done, count, at});
+        done += count;
+    }
+    return bands;
+}
+
 // The caller's buffer as a line of pixels, and the place of an image pixel on it. Rows above the image have negative
 // numbers, and places off the line are dropped.
 struct BmpModel::Walk {
@@ -96,6 +112,7 @@ struct BmpModel::Walk {
     Bytes output;
     std::vector<char> landed; // 1 where a pixel was put
     bool blue_first;
+    bool band_only = false; // the buffer begins with the first row that is put
 
     Walk(const BmpRequest &wanted, const ScaledSize &scaled, bool reversed, uint8_t background)
         : request(wanted), size(scaled), row_pixels(wanted.is_exact() ? scaled.width : wanted.box_width),
@@ -108,7 +125,7 @@ struct BmpModel::Walk {
     int64_t place(int64_t x, int64_t y) const {
         const bool turned = request.quarter_turns % 2 == 1;
         const int64_t left = halved_down(row_pixels - (turned ? size.height : size.width));
-        const int64_t top = halved_down(rows - (turned ? size.width : size.height));
+        const int64_t top = band_only ? 0 : halved_down(rows - (turned ? size.width : size.height));
         switch (request.quarter_turns) {
         case 0: return (top + y) * row_pixels + left + x;
         case 1: return (top + x) * row_pixels + left + size.height - 1 - y;
@@ -214,13 +231,23 @@ size_t BmpModel::rows_reached(bool one_to_one) const {
     return rows;
 }
 
-void BmpModel::paint_one_to_one(Walk &walk) const {
-    const size_t reached = rows_reached(true);
-    for (size_t i = 0; i < reached; ++i) {
-        const int32_t y = row_in_file(static_cast<int32_t>(i));
-        const bool upwards = top_down_ && kind_ == PELM_SOURCE_SEQUENTIAL;
+// A row of a band, counted in the order in which rows are finished, and where it goes.
+struct BandRow {
+    int64_t row, place;
+};
+
+BandRow band_row(const BmpBand &band, int64_t i, bool top_down, bool sequential) {
+    const int64_t below = top_down ? i : band.count - 1 - i;
+    return {band.first + below, band.at + (top_down && sequential ? -below : below)};
+}
+
+void BmpModel::paint_one_to_one(Walk &walk, const BmpBand &band) const {
+    const int64_t reached = static_cast<int64_t>(rows_reached(true));
+    for (int64_t i = 0; i < band.count; ++i) {
+        const BandRow at = band_row(band, i, top_down_, kind_ == PELM_SOURCE_SEQUENTIAL);
+        if (row_in_file(static_cast<int32_t>(at.row)) >= reached) continue;
         for (int32_t x = 0; x < width_; ++x)
-            walk.put(x, upwards ? -y : y, image_[static_cast<size_t>(y)][static_cast<size_t>(x)]);
+            walk.put(x, at.place, image_[static_cast<size_t>(at.row)][static_cast<size_t>(x)]);
     }
 }
 
@@ -240,40 +267,67 @@ Rgb BmpModel::averaged(const int64_t (&columns)[2], const int64_t (&rows)[2]) co
             static_cast<uint8_t>(sum[2] / after)};
 }
 
-void BmpModel::paint_scaled(Walk &walk) const {
+void BmpModel::paint_scaled(Walk &walk, const BmpBand &band) const {
     const int64_t reached = static_cast<int64_t>(rows_reached(false));
     const int64_t sw = walk.size.width;
     const int64_t sh = walk.size.height;
     const int64_t w = width_;
     const int64_t h = height_;
-    for (int64_t i = 0; i < sh; ++i) {
-        const int64_t k = top_down_ ? i : sh - 1 - i; // in the order in which rows are finished
-        const int64_t rows[2] = {(k * h + h / 4) / sh, (k * h + 3 * h / 4) / sh};
+    for (int64_t i = 0; i < band.count; ++i) {
+        const BandRow at = band_row(band, i, top_down_, kind_ == PELM_SOURCE_SEQUENTIAL);
+        const int64_t rows[2] = {(at.row * h + h / 4) / sh, (at.row * h + 3 * h / 4) / sh};
         if (row_in_file(static_cast<int32_t>(rows[0])) >= reached ||
             row_in_file(static_cast<int32_t>(rows[1])) >= reached)
             continue;
-        const bool upwards = top_down_ && kind_ == PELM_SOURCE_SEQUENTIAL;
         for (int64_t j = 0; j < sw; ++j) {
             const int64_t columns[2] = {(j * w + w / 4) / sw, (j * w + 3 * w / 4) / sw};
-            walk.put(j, upwards ? -k : k, averaged(columns, rows));
+            walk.put(j, at.place, averaged(columns, rows));
         }
     }
 }
 
-BmpExpectation BmpModel::expect(const BmpRequest &request, uint8_t background) const {
+void BmpModel::paint(Walk &walk, const BmpBand &band) const {
+    if (refused_ || walk.output.empty()) return;
+    if (walk.size.one_to_one)
+        paint_one_to_one(walk, band);
+    else if (walk.size.width > 0 && walk.size.height > 0 && height_ > 0)
+        paint_scaled(walk, band);
+}
+
+ScaledSize BmpModel::size_for(const BmpRequest &request) const {
     const bool turned = request.quarter_turns % 2 == 1;
-    const ScaledSize size = scaled_size(width_, height_, turned ? request.box_height : request.box_width,
-                                        turned ? request.box_width : request.box_height, request.placement);
-    const bool reversed = request.format == 6 && !size.one_to_one && bits_ != 32;
-    Walk walk(request, size, reversed, background);
-    if (!refused_ && !walk.output.empty()) {
-        if (size.one_to_one)
-            paint_one_to_one(walk);
-        else if (size.width > 0 && size.height > 0 && height_ > 0)
-            paint_scaled(walk);
-    }
+    return scaled_size(width_, height_, turned ? request.box_height : request.box_width,
+                       turned ? request.box_width : request.box_height, request.placement);
+}
+
+bool BmpModel::reverses(const BmpRequest &request, const ScaledSize &size) const {
+    return request.format == 6 && !size.one_to_one && bits_ != 32;
+}
+
+BmpExpectation BmpModel::expect(const BmpRequest &request, uint8_t background) const {
+    return expect_bands(request, {INT32_MAX}, background);
+}
+
+BmpExpectation BmpModel::expect_bands(const BmpRequest &request, const std::vector<int32_t> &rows,
+                                      uint8_t background) const {
+    const ScaledSize size = size_for(request);
+    Walk walk(request, size, reverses(request, size), background);
+    for (const BmpBand &band : bands_of(size.height, rows))
+        paint(walk, band);
     const size_t landed = static_cast<size_t>(std::count(walk.landed.begin(), walk.landed.end(), 1));
     return {refused_, blocks_left_, size, std::move(walk.output), walk.row_pixels, landed};
+}
+
+Bytes BmpModel::expect_line(const BmpRequest &request, int64_t first, int64_t count, uint8_t background) const {
+    BmpRequest plain = request;
+    plain.quarter_turns = 0;
+    plain.placement = request.stretches() ? 0x700 : 0;
+    const ScaledSize size = size_for(plain);
+    plain.box_height = static_cast<int32_t>(count);
+    Walk walk(plain, size, reverses(plain, size), background);
+    walk.band_only = true;
+    paint(walk, {first, count, 0});
+    return std::move(walk.output);
 }
 
 } // namespace pelm::test

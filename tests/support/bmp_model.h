@@ -1,5 +1,5 @@
-// What a one-shot BMP decode must leave behind, computed pixel by pixel on plain two-dimensional arrays: by formula,
-// slowly, and sharing nothing with the library. Only the constants of the public header are used.
+// What a BMP decode, in one call or in bands, must leave behind, computed pixel by pixel on plain two-dimensional
+// arrays: by formula, slowly, and sharing nothing with the library. Only the constants of the public header are used.
 #pragma once
 
 #include "tests/support/bmp_builder.h"
@@ -48,13 +48,28 @@ struct BmpExpectation {
     size_t pixels_landed; // written at least once
 };
 
-// A well-formed file, possibly cut short, as one kind of source delivers it.
+// Rows `first` .. `first` + `count` - 1 of the scaled image, the first one put where image row `at` belongs.
+struct BmpBand {
+    int64_t first, count, at;
+};
+
+// The bands that calls with these row counts decode: each is cut at the image's end and, except for the first, placed
+// as many rows behind the one before as it was asked to have itself. Counts below 1 give none.
+std::vector<BmpBand> bands_of(int64_t scaled_height, const std::vector<int32_t> &rows);
+
+// A well-formed file, possibly cut short, as one kind of source delivers it. Sequential ones only in one band.
 class BmpModel {
 public:
     // `bytes` are those of `file` or a beginning of them.
     BmpModel(const BmpFile &file, const Bytes &bytes, uint32_t kind);
 
     BmpExpectation expect(const BmpRequest &request, uint8_t background) const;
+
+    // The same after calls with these row counts.
+    BmpExpectation expect_bands(const BmpRequest &request, const std::vector<int32_t> &rows, uint8_t background) const;
+
+    // The buffer of one band of a line call: never turned, only stretched or not, and with nothing above it.
+    Bytes expect_line(const BmpRequest &request, int64_t first, int64_t count, uint8_t background) const;
 
 private:
     struct Walk; // where pixels go
@@ -65,8 +80,11 @@ private:
     size_t rows_reached(bool one_to_one) const;
     int32_t row_in_file(int32_t y) const { return top_down_ ? y : height_ - 1 - y; }
     Rgb averaged(const int64_t (&columns)[2], const int64_t (&rows)[2]) const;
-    void paint_one_to_one(Walk &walk) const;
-    void paint_scaled(Walk &walk) const;
+    ScaledSize size_for(const BmpRequest &request) const;
+    bool reverses(const BmpRequest &request, const ScaledSize &size) const;
+    void paint(Walk &walk, const BmpBand &band) const;
+    void paint_one_to_one(Walk &walk, const BmpBand &band) const;
+    void paint_scaled(Walk &walk, const BmpBand &band) const;
 
     uint32_t kind_;
     int32_t width_;
