@@ -30,7 +30,7 @@ bool refill(CodeBytes &codes) {
 }
 
 // False when the codes run out before `count` bytes.
-bool take(CodeBytes &codes, uint8_t *bytes, ptrdiff_t count) {
+bool collect(CodeBytes &codes, uint8_t *bytes, ptrdiff_t count) {
     while (count > 0) {
         if (codes.at == codes.end && !refill(codes)) return false;
         const ptrdiff_t piece = std::min(count, codes.end - codes.at);
@@ -40,6 +40,14 @@ bool take(CodeBytes &codes, uint8_t *bytes, ptrdiff_t count) {
         count -= piece;
     }
     return true;
+}
+
+// The next `count` bytes: where they are, or in `room` when a refill parts them. NULL when the codes run out before.
+inline const uint8_t *take(CodeBytes &codes, uint8_t *room, ptrdiff_t count) {
+    if (codes.end - codes.at < count) return collect(codes, room, count) ? room : nullptr;
+    const uint8_t *const bytes = codes.at;
+    codes.at += count;
+    return bytes;
 }
 
 // Required: codes beyond the width are read and dropped; only an escape ends the row (docs/oddities.md, "Run-length
@@ -64,9 +72,10 @@ void add_run(RunLengthReader &reader, int32_t count, uint8_t value) {
 // Literal indices fill whole bytes, and these an even number of them: every code begins an even number of bytes behind
 // the first one.
 bool add_literals(RunLengthReader &reader, int32_t count) {
-    uint8_t bytes[longest_literal_bytes];
+    uint8_t room[longest_literal_bytes];
     const int32_t filled = reader.bits == 8 ? count : (count + 1) / 2;
-    if (!take(reader.codes, bytes, filled + filled % 2)) return false;
+    const uint8_t *const bytes = take(reader.codes, room, filled + filled % 2);
+    if (bytes == nullptr) return false;
     count = room_for(reader, count);
     uint8_t *const to = reader.row + reader.covered;
     if (reader.bits == 8) {
@@ -81,8 +90,8 @@ bool add_literals(RunLengthReader &reader, int32_t count) {
 
 // Required: a delta is read and moves nothing (docs/oddities.md, "Run-length codes").
 bool skip_delta(CodeBytes &codes) {
-    uint8_t offsets[2];
-    return take(codes, offsets, 2);
+    uint8_t room[2];
+    return take(codes, room, 2) != nullptr;
 }
 
 // Up to the escape that ends the row. False when the codes run out before it.
@@ -90,13 +99,15 @@ bool skip_delta(CodeBytes &codes) {
 bool expand_row(RunLengthReader &reader) {
     std::fill_n(reader.row, reader.covered, uint8_t{0});
     reader.covered = 0;
-    uint8_t code[2];
-    while (take(reader.codes, code, 2)) {
-        if (code[0] != 0)
-            add_run(reader, code[0], code[1]);
-        else if (code[1] == end_of_line || code[1] == end_of_bitmap)
+    uint8_t room[2];
+    while (const uint8_t *const code = take(reader.codes, room, 2)) {
+        const uint8_t count = code[0];
+        const uint8_t value = code[1];
+        if (count != 0)
+            add_run(reader, count, value);
+        else if (value == end_of_line || value == end_of_bitmap)
             return true;
-        else if (!(code[1] == delta ? skip_delta(reader.codes) : add_literals(reader, code[1])))
+        else if (!(value == delta ? skip_delta(reader.codes) : add_literals(reader, value)))
             return false;
     }
     return false;
