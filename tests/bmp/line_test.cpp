@@ -2,13 +2,12 @@
 #include <climits>
 
 #include "bmp/working.h"
-#include "tests/bmp/expectations.h"
+#include "tests/bmp/bands.h"
 
 namespace pelm::test {
 namespace {
 
 const BmpVariant &rgb24 = variant_named("twenty_four_bits");
-constexpr uint32_t seekable_kinds[] = {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM, PELM_SOURCE_STREAM_ALT};
 
 // One decode by lines, and the buffer of one band at a time, just as large as the band.
 class Lines {
