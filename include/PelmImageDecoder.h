@@ -139,8 +139,8 @@ PELM_API int32_t ZOTARPELMI_DecodeBMP(ImageDecodeInfo *info, void *output, int32
 
 /*
  * The same in bands of rows, all into the buffer of the first call: pass the same request, buffer and box each time.
- * `output` counts in the first call only. With kind 4 only the first band is what it should be: buffer such a source,
- * or decode it in one call.
+ * `output` counts in the first call only. Kind 4 is for whole images: its rows are read from where the stream stands,
+ * whichever band is wanted.
  *
  * IterLine: the next `rows` rows of the scaled image, or as many as remain. Keep `rows` the same until the end: each
  * later band is placed by its own height, as if all before had been as high. 0 or fewer rows decode nothing.

@@ -263,22 +263,11 @@ TEST_F(BmpTwoStepRefusals, every_failing_allocation_releases_everything) {
 // Whatever a parked header holds, nothing is written outside, and everything is freed.
 TEST_F(BmpTwoStepRefusals, headers_of_noise_do_no_harm) {
     Noise noise(98);
-    const int32_t sides[] = {0, 1, -1, 2, 7, -7, 31, 33, 255, 65535, INT_MAX, INT_MIN, 0x20000000};
-    const uint32_t bits[] = {0, 1, 2, 4, 8, 16, 24, 32, 64, 65535};
-    const uint32_t offsets[] = {0, 53, 54, 58, 66, 118, 1078, 131126, 0x7FFFFFFF, 0x80000000, 0xFFFFFFFF};
     const int runs = quick() ? 4000 : 40000;
     for (int i = 0; i < runs; ++i) {
         host.reset();
-        BmpFile file;
-        file.width = sides[noise.below(std::size(sides))];
-        file.height = sides[noise.below(std::size(sides))];
-        file.bits = static_cast<uint16_t>(bits[noise.below(std::size(bits))]);
+        BmpFile file = noise_header(noise);
         file.compression = noise.below(8);
-        file.pixel_data_offset = offsets[noise.below(std::size(offsets))];
-        if (noise.below(2) == 0) file.masks = {0xF800, 0x07E0, 0x001F};
-        file.gap.resize(noise.below(1500));
-        for (uint8_t &byte : file.gap)
-            byte = static_cast<uint8_t>(noise.next());
         host.faults.largest_block = 1 << 20;
         const BmpRequest request{noise.below(10), static_cast<int>(noise.below(4)), noise.below(8) << 8,
                                  static_cast<int32_t>(noise.below(40)), static_cast<int32_t>(noise.below(40))};
@@ -287,9 +276,7 @@ TEST_F(BmpTwoStepRefusals, headers_of_noise_do_no_harm) {
             static_cast<size_t>(request.box_width * request.box_height * buffer_bytes_per_pixel(request.format));
         const BmpDecode decode =
             decode_by(two_steps(request), source, request, size, i % 2 == 0 ? Edge::end : Edge::start);
-        if (source.source.kind == PELM_SOURCE_MEMORY || decode.result == 1 || decode.info.decoderState != nullptr) {
-            ASSERT_EQ(decode.misbehaviour, "") << described(file, 0) << "; " << described(request);
-        }
+        ASSERT_EQ(decode.misbehaviour, "") << described(file, 0) << "; " << described(request);
         ASSERT_EQ(decode.live_blocks.size(), 0u) << described(file, 0) << "; " << described(request);
     }
 }

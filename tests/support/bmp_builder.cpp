@@ -155,6 +155,24 @@ BmpFile noise_bmp(const BmpVariant &variant, int32_t width, int32_t height, bool
     return file_of(variant, noise_picture(width, height, variant.bits, seed), width, top_down, palette);
 }
 
+BmpFile noise_header(Noise &noise) {
+    static constexpr int32_t sides[] = {0,  1,   -1,    2,     7,         -7,        31,
+                                        33, 255, 65535, 65536, INT32_MAX, INT32_MIN, 0x20000000};
+    static constexpr uint16_t depths[] = {0, 1, 2, 4, 8, 15, 16, 24, 32, 64, 65535};
+    static constexpr uint32_t offsets[] = {0,    53,     54,     58,         62,         66,        118,
+                                           1078, 131125, 131126, 0x7FFFFFFF, 0x80000000, 0xFFFFFFFF};
+    BmpFile file;
+    file.width = sides[noise.below(std::size(sides))];
+    file.height = sides[noise.below(std::size(sides))];
+    file.bits = depths[noise.below(std::size(depths))];
+    file.pixel_data_offset = offsets[noise.below(std::size(offsets))];
+    if (noise.below(2) == 0) file.masks = {0xF800, 0x07E0, 0x001F};
+    file.gap.resize(noise.below(1500));
+    for (uint8_t &byte : file.gap)
+        byte = static_cast<uint8_t>(noise.next());
+    return file;
+}
+
 BmpFile flat_bmp(const BmpVariant &variant, int32_t width, int32_t height, uint32_t value, Bytes palette) {
     const std::vector<uint32_t> row(static_cast<size_t>(width), value);
     return file_of(variant, Picture(static_cast<size_t>(height), row), width, false, std::move(palette));

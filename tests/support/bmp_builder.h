@@ -81,6 +81,10 @@ Bytes noise_palette(uint32_t entries, uint32_t seed);
 // A well-formed file of noise with a full palette.
 BmpFile noise_bmp(const BmpVariant &variant, int32_t width, int32_t height, bool top_down, uint32_t seed = 1);
 
+// A header of 40 bytes whose sizes, depth and pixel offset are anything, near and beyond what can be decoded, with or
+// without masks, in front of noise.
+BmpFile noise_header(Noise &noise);
+
 // A well-formed file of one stored pixel value; `palette` serves the indexed depths.
 BmpFile flat_bmp(const BmpVariant &variant, int32_t width, int32_t height, uint32_t value, Bytes palette = {});
 
