@@ -281,6 +281,24 @@ TEST_F(BmpLine, a_sequential_source_is_decoded_whole_in_one_band) {
             }
 }
 
+TEST_F(BmpLine, later_bands_of_a_sequential_source_read_from_its_start) {
+    // 2 x 8 to 1 x 4, top-down: output row 2 averages file rows 4 and 5, taken from the file's bytes 0 to 5 and 8
+    // to 13.
+    const BmpFile file = noise_bmp(rgb24, 2, 8, true);
+    const Bytes bytes = file_bytes(file);
+    Lines lines(file, PELM_SOURCE_SEQUENTIAL, {8, 0, 0, 1, 4}, 16);
+    EXPECT_EQ(lines.decode(2, 8), 1);
+    EXPECT_EQ(lines.decode(2, 8), 1);
+    Bytes expected(8, background);
+    for (size_t channel = 0; channel < 3; ++channel)
+        expected[channel] =
+            static_cast<uint8_t>((bytes[channel] + bytes[3 + channel] + bytes[8 + channel] + bytes[11 + channel]) / 4);
+    expected[3] = 255;
+    EXPECT_EQ(lines.band(), expected) << "its second row goes above it";
+    EXPECT_EQ(lines.info().decoderState, nullptr);
+    EXPECT_TRUE(host.live_blocks().empty());
+}
+
 TEST_F(BmpLine, another_width_on_a_later_call_moves_the_margin_and_stays_within_its_rows) {
     const BmpFile file = noise_bmp(rgb24, 3, 6, false);
     const Bytes whole = BmpSubject(file).expect({1, 0, 0, 3, 6}).output;

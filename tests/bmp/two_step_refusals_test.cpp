@@ -229,6 +229,21 @@ TEST_F(BmpTwoStepRefusals, a_parked_record_that_is_not_wanted_is_destroyed_witho
     }
 }
 
+TEST_F(BmpTwoStepRefusals, bands_of_a_parked_record_end_at_once_and_free_it) {
+    for (const auto call : {ZOTARPELMI_DecodeBMPIterLine, ZOTARPELMI_DecodeBMPLine}) {
+        host.reset();
+        TestSource source(PELM_SOURCE_MEMORY, file_bytes(noise_bmp(rgb24, 9, 7, true)));
+        ImageDecodeInfo info{};
+        info.input = &source.source;
+        Bytes output(126, background);
+        ASSERT_EQ(ZOTARPELMI_PreInitBMP(&info, 1), 1);
+        EXPECT_EQ(call(&info, output.data(), 9, 7, 3), 1);
+        EXPECT_EQ(info.decoderState, nullptr);
+        EXPECT_EQ(output, Bytes(126, background));
+        EXPECT_TRUE(host.live_blocks().empty());
+    }
+}
+
 TEST_F(BmpTwoStepRefusals, every_failing_allocation_releases_everything) {
     for (const BmpVariant &variant : bmp_variants)
         for (const uint32_t kind : all_kinds)
