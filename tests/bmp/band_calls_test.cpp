@@ -82,7 +82,7 @@ TEST_F(BmpBandCalls, later_bands_of_a_sequential_source_read_from_its_start) {
         return pixels;
     };
     Bytes expected;
-    for (const size_t offset : {54 + 20, 54, 20, 0}) {
+    for (const size_t offset : {size_t{74}, size_t{54}, size_t{20}, size_t{0}}) {
         const Bytes pixels = row(offset);
         expected.insert(expected.end(), pixels.begin(), pixels.end());
     }
