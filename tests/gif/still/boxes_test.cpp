@@ -63,6 +63,28 @@ TEST_F(GifBoxes, small_boxes_of_all_shapes_are_filled_as_computed) {
                 }
 }
 
+// Buffers that no memory holds, or with rows beyond what 32-bit steps reach, may be refused.
+bool may_be_refused(const GifRequest &request) {
+    const GifBufferShape shape = gif_buffer_shape(9, 7, request);
+    if (shape.row_pixels <= 0 || shape.rows <= 0) return false;
+    return shape.row_pixels > most / shape.pixel_bytes ||
+           shape.row_pixels * shape.rows > PTRDIFF_MAX / shape.pixel_bytes;
+}
+
+// A failure that leaves nothing behind.
+bool is_refused(const Bytes &file, const GifRequest &request, GifCall call) {
+    TestHost::get().reset();
+    TestSource source(PELM_SOURCE_MEMORY, file);
+    ImageDecodeInfo info{};
+    info.input = &source.source;
+    info.outputFormat = request.format;
+    info.flags = request.flags();
+    const int32_t result = call == GifCall::one_shot
+                               ? ZOTARPELMI_DecodeGIF(&info, nullptr, request.box_width, request.box_height)
+                               : ZOTARPELMI_DecodeGIFIter(&info, nullptr, request.box_width, request.box_height);
+    return result == 0 && info.decoderState == nullptr && TestHost::get().live_blocks().empty();
+}
+
 TEST_F(GifBoxes, absurd_boxes_decode_the_image_and_write_nothing_outside) {
     const Bytes file = still_file({9, 7, 8}).bytes;
     for (const int32_t width : {least, least + 1, -65536, -1, 0, 1, 4, 65536, most - 1, most})
@@ -74,6 +96,7 @@ TEST_F(GifBoxes, absurd_boxes_decode_the_image_and_write_nothing_outside) {
                         GifSetting setting;
                         setting.no_output = gif_buffer_shape(9, 7, request).bytes() > 1u << 20 ||
                                             (width > 0 && height > 0 && int64_t{width} * height > 1 << 20);
+                        if (may_be_refused(request) && is_refused(file, request, call)) continue;
                         EXPECT_EQ(gif_difference(file, request, call, setting), "");
                     }
 }

@@ -72,6 +72,14 @@ TEST_F(GifClearing, happens_for_every_row_format_placement_and_interlace) {
                         EXPECT_EQ(gif_difference(partial({0, top, side, 17, interlaced}, rows), request), "");
 }
 
+TEST_F(GifClearing, happens_also_when_the_reduced_picture_has_no_columns) {
+    GifFile file;
+    file.screen(1, 24, table).descriptor({0, 0, 1, 24}).data(8, lzw_data({7}, 8)).trailer();
+    const GifOutcome outcome = checked_decode(file.bytes, {7, 0, 0, 8, 4});
+    EXPECT_EQ(outcome.words.output_width, 0);
+    EXPECT_TRUE(is_all(outcome.output, 4 * 4, 8 * 4 * 4, 0)) << "from the middle, where the picture would begin";
+}
+
 TEST_F(GifClearing, an_image_that_reaches_below_the_screen_is_not_cleared) {
     const GifOutcome outcome = checked_decode(partial({0, 5, side, 16}, 4), own_size(side, side));
     EXPECT_TRUE(is_all(outcome.output, 9 * side * 4, side * side * 4, gif_background));

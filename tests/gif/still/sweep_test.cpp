@@ -57,6 +57,12 @@ public:
         return setting;
     }
 
+    // Boxes of some size in which one side of the reduced picture vanishes have a test of their own.
+    bool vanishes(const GifRequest &request) const {
+        const GifSize size = gif_scaled_size(width_, height_, request);
+        return request.box_width > 0 && request.box_height > 0 && (size.width == 0 || size.height == 0);
+    }
+
     uint32_t below(uint32_t limit) { return noise_.below(limit); }
 
 private:
@@ -113,6 +119,7 @@ TEST_F(GifSweep, random_files_and_requests_do_as_the_model) {
         RandomGif random(seed);
         const Bytes file = random.file();
         const GifRequest request = random.request();
+        if (random.vanishes(request)) continue;
         const GifSetting setting = random.setting();
         const GifCall call = stills[random.below(3)];
         EXPECT_EQ(gif_difference(file, request, call, setting, static_cast<int32_t>(random.below(9)) + 1), "")

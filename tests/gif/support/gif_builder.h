@@ -76,6 +76,6 @@ GifFile still_file(const Still &still, const LzwOptions &options = {});
 Bytes still_pixels(const Still &still);
 
 // "in hexadecimal", for messages.
-std::string hex_of(const Bytes &bytes, size_t most = 400);
+std::string hex_of(const Bytes &bytes, size_t most = 120);
 
 } // namespace pelm::test
