@@ -112,12 +112,12 @@ TEST_F(GifComposition, a_frame_without_its_own_control_inherits_the_one_before) 
 
 // Every place that a frame can have: inside, touching the edges, outside, empty, larger than the screen.
 constexpr ImagePlace places[] = {
-    {2, 3, 4, 3},      {0, 0, width, height}, {0, 0, 3, 2},        {7, 6, 3, 2},         {7, 0, 3, 8},
-    {0, 7, 10, 1},     {8, 6, 5, 5},          {10, 2, 3, 3},       {12, 2, 3, 3},        {3, 8, 3, 3},
-    {3, 20, 3, 3},     {65535, 65535, 3, 2},  {0, 0, 0, 0},        {4, 4, 0, 3},         {4, 4, 3, 0},
-    {10, 8, 0, 0},     {0, 0, 13, 11},        {3, 2, 30, 3},       {2, 3, 3, 30},        {9, 7, 1, 1},
-    {1, 2, 5, 5, true}, {0, 0, 10, 8, true},  {2, 0, 4, 4, true},  {2, 3, 4, 3, true},   {1, 5, 3, 2, true},
-    {0, 7, 4, 5, true}, {0, 1, 5, 17, true},  {6, 0, 9, 12, true}, {3, 30, 3, 9, true},
+    {2, 3, 4, 3},       {0, 0, width, height}, {0, 0, 3, 2},        {7, 6, 3, 2},        {7, 0, 3, 8},
+    {0, 7, 10, 1},      {8, 6, 5, 5},          {10, 2, 3, 3},       {12, 2, 3, 3},       {3, 8, 3, 3},
+    {3, 20, 3, 3},      {65535, 65535, 3, 2},  {0, 0, 0, 0},        {4, 4, 0, 3},        {4, 4, 3, 0},
+    {10, 8, 0, 0},      {0, 0, 13, 11},        {3, 2, 30, 3},       {2, 3, 3, 30},       {9, 7, 1, 1},
+    {1, 2, 5, 5, true}, {0, 0, 10, 8, true},   {2, 0, 4, 4, true},  {2, 3, 4, 3, true},  {1, 5, 3, 2, true},
+    {0, 7, 4, 5, true}, {0, 1, 5, 17, true},   {6, 0, 9, 12, true}, {3, 30, 3, 9, true},
 };
 
 TEST_F(GifComposition, every_disposal_transparency_and_place_together) {
@@ -145,7 +145,9 @@ TEST_F(GifComposition, every_format_rotation_and_size) {
             const uint32_t seed = format + place.left;
             if (quick_gif_run() && seed % 4 != 0) continue;
             Animation animation{width, height, 2, 2, {}, true, seed};
-            animation.frames = {{{3, 2, 4, 4}, {2, 1, 3}}, {place, {2, 2, 5}}, {{1, 1, 7, 5}, {3, -1}},
+            animation.frames = {{{3, 2, 4, 4}, {2, 1, 3}},
+                                {place, {2, 2, 5}},
+                                {{1, 1, 7, 5}, {3, -1}},
                                 {{0, 0, width, height}, {1, 1}}};
             for (uint32_t turns = 0; turns < 4; ++turns)
                 for (const GifRequest &box :

@@ -205,8 +205,13 @@ TEST_F(GifFrameFailures, random_animations_do_as_the_model) {
         Noise noise(seed + 4242);
         const auto below = [&noise](uint32_t limit) { return (noise.next() >> 6) % limit; };
         const auto size = [&below](uint32_t limit) { return static_cast<uint16_t>(below(limit)); };
-        Animation animation{static_cast<uint16_t>(1 + below(16)), static_cast<uint16_t>(1 + below(20)),
-                            static_cast<int>(1 + below(4)), static_cast<uint8_t>(below(20)), {}, below(6) > 0, seed};
+        Animation animation{static_cast<uint16_t>(1 + below(16)),
+                            static_cast<uint16_t>(1 + below(20)),
+                            static_cast<int>(1 + below(4)),
+                            static_cast<uint8_t>(below(20)),
+                            {},
+                            below(6) > 0,
+                            seed};
         for (uint32_t i = 1 + below(5); i > 0; --i) {
             Frame frame;
             frame.place = {size(20), size(22), size(24), static_cast<uint16_t>(2 + below(22)), below(3) == 0};
@@ -219,7 +224,10 @@ TEST_F(GifFrameFailures, random_animations_do_as_the_model) {
         Bytes file = animation.file();
         for (uint32_t i = below(3) == 0 ? 1 + below(4) : 0; i > 0; --i)
             file[30 + below(static_cast<uint32_t>(file.size()) - 30)] = static_cast<uint8_t>(below(256));
-        const GifRequest box{gif_formats[below(8)], below(4), below(3) == 0 ? 0x700u : below(4) == 0 ? 0x100u : 0u,
+        const GifRequest box{gif_formats[below(8)], below(4),
+                             below(3) == 0   ? 0x700u
+                             : below(4) == 0 ? 0x100u
+                                             : 0u,
                              static_cast<int32_t>(below(30)), static_cast<int32_t>(below(30))};
         EXPECT_EQ(gif_difference(file, box, frame_calls[seed % 2]), "") << "seed " << seed;
     }

@@ -10,10 +10,11 @@ constexpr uint32_t placements[] = {0, 0x100, 0x200, 0x300, 0x600, 0x700};
 
 class GifBoxes : public GifTest {
 protected:
-    static GifSize size_of(int32_t width, int32_t height, int32_t box_width, int32_t box_height,
-                           uint32_t placement = 0, uint32_t turns = 0) {
-        const GifOutcome outcome = checked_decode(still_file({static_cast<uint16_t>(width), static_cast<uint16_t>(height)}).bytes,
-                                                  {1, turns, placement, box_width, box_height});
+    static GifSize size_of(int32_t width, int32_t height, int32_t box_width, int32_t box_height, uint32_t placement = 0,
+                           uint32_t turns = 0) {
+        const GifOutcome outcome =
+            checked_decode(still_file({static_cast<uint16_t>(width), static_cast<uint16_t>(height)}).bytes,
+                           {1, turns, placement, box_width, box_height});
         return {outcome.words.output_width, outcome.words.output_height, false};
     }
     static void expect_size(GifSize got, int64_t width, int64_t height) {

@@ -133,7 +133,8 @@ TEST_F(GifCodes, the_code_behind_a_clear_code_is_a_root_without_a_check) {
 }
 
 TEST_F(GifCodes, strings_that_grow_beyond_the_table_decode_as_code_zero) {
-    // Every repetition makes a string longer by one; a clear code keeps them, and the unchecked root goes on from there.
+    // Every repetition makes a string longer by one; a clear code keeps them, and the unchecked root goes on from
+    // there.
     Codes codes = {4, 0};
     for (uint32_t code = 6; code < 4096; ++code)
         codes.push_back(code);

@@ -167,8 +167,8 @@ TEST_F(GifHeader, a_trailer_before_any_image_leaves_the_output_alone_and_fails) 
 
 TEST_F(GifHeader, a_trailer_before_any_image_ends_every_call_as_empty_data_would) {
     for (const Bytes &behind : {Bytes{}, Bytes{0}, Bytes{1, 0}, Bytes{1, 1, 0}, Bytes{1, 0, 0, 0}, Bytes(9, 3)})
-        for (const GifCall call : {GifCall::one_shot, GifCall::iterative, GifCall::line, GifCall::frame,
-                                   GifCall::frame_iterative})
+        for (const GifCall call :
+             {GifCall::one_shot, GifCall::iterative, GifCall::line, GifCall::frame, GifCall::frame_iterative})
             EXPECT_EQ(gif_difference(begun().trailer().raw(behind).bytes, own_size(side, side), call, {}, side), "");
 }
 

@@ -72,8 +72,8 @@ TEST_F(GifIterative, gives_the_picture_of_the_one_shot_call) {
     for (const bool interlaced : {false, true})
         for (const uint16_t height : std::initializer_list<uint16_t>{1, 15, 16, 17, 31, 32, 33, 100}) {
             const Bytes file = still_file({19, height, 5, interlaced, height}).bytes;
-            for (const GifRequest &request : {own_size(19, height), GifRequest{1, 1, 0, height, 12},
-                                              GifRequest{0, 3, 0x700, height, 25}}) {
+            for (const GifRequest &request :
+                 {own_size(19, height), GifRequest{1, 1, 0, height, 12}, GifRequest{0, 3, 0x700, height, 25}}) {
                 const GifOutcome outcome = checked_decode(file, request, GifCall::iterative);
                 EXPECT_EQ(outcome.output, checked_decode(file, request).output) << request.described();
             }

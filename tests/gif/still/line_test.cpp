@@ -50,8 +50,8 @@ TEST_F(GifLine, rows_that_one_string_completes_are_neither_lost_nor_repeated) {
 
 TEST_F(GifLine, reduced_rows_are_those_of_the_one_shot_call_and_one_more_call_ends) {
     const Bytes file = still_file({50, 41, 8}).bytes;
-    for (const GifRequest &request : {GifRequest{1, 0, 0x100, 20, 16}, GifRequest{8, 0, 0x100, 49, 40},
-                                      GifRequest{0, 0, 0x100, 3, 40}}) {
+    for (const GifRequest &request :
+         {GifRequest{1, 0, 0x100, 20, 16}, GifRequest{8, 0, 0x100, 49, 40}, GifRequest{0, 0, 0x100, 3, 40}}) {
         const GifOutcome whole = checked_decode(file, request);
         GifRequest lines = request;
         lines.box_width = whole.words.output_width; // the same size once more, in rows of just that width
@@ -71,8 +71,8 @@ TEST_F(GifLine, reduced_rows_are_those_of_the_one_shot_call_and_one_more_call_en
 
 TEST_F(GifLine, stretched_rows_come_from_their_source_row_as_often_as_needed) {
     const Bytes file = still_file({7, 5, 8}).bytes;
-    for (const GifRequest &request : {GifRequest{1, 0, 0x700, 15, 19}, GifRequest{7, 0, 0x700, 3, 11},
-                                      GifRequest{10, 0, 0x700, 20, 2}})
+    for (const GifRequest &request :
+         {GifRequest{1, 0, 0x700, 15, 19}, GifRequest{7, 0, 0x700, 3, 11}, GifRequest{10, 0, 0x700, 20, 2}})
         for (const int32_t rows : {1, 2, 4, 40})
             expect_beginning(gathered(file, request, rows), checked_decode(file, request).output, request.described());
 }

@@ -8,8 +8,9 @@ namespace {
 constexpr GifCall stills[] = {GifCall::one_shot, GifCall::iterative, GifCall::line};
 
 std::vector<uint32_t> listed_blocks(uint32_t screen_width, uint32_t image_width) {
-    std::vector<uint32_t> blocks{sizeof(GifDecoderState), sizeof(GifInput), 16384, 1024, 1024, sizeof(GifLzwTables),
-                                 16384, 4096, 16384, screen_width + 4096, screen_width * 4};
+    std::vector<uint32_t> blocks{
+        sizeof(GifDecoderState), sizeof(GifInput), 16384, 1024, 1024, sizeof(GifLzwTables), 16384, 4096, 16384,
+        screen_width + 4096,     screen_width * 4};
     if (image_width > screen_width) blocks.push_back(image_width + 4096);
     return blocks;
 }

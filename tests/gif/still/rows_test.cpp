@@ -222,7 +222,8 @@ TEST_F(GifReduction, an_image_is_never_enlarged_to_fit_but_stretched_where_asked
     EXPECT_EQ(stretched.words.output_height, 20);
     for (size_t row = 0; row < 20; ++row)
         for (size_t column = 0; column < 20; ++column)
-            EXPECT_EQ(pixel_of(stretched.output, row * 20 + column), pixels[(row * 5 + 2) / 20 * 10 + (column * 10 + 5) / 20]);
+            EXPECT_EQ(pixel_of(stretched.output, row * 20 + column),
+                      pixels[(row * 5 + 2) / 20 * 10 + (column * 10 + 5) / 20]);
 }
 
 TEST_F(GifReduction, turning_a_reduced_picture_turns_its_pixels) {
@@ -239,7 +240,7 @@ TEST_F(GifReduction, turning_a_reduced_picture_turns_its_pixels) {
             Bytes expected;
             for (size_t y = 0; y < (sideways ? w : h); ++y)
                 for (size_t x = 0; x < (sideways ? h : w); ++x) {
-                    const size_t from = turns == 1 ? (h - 1 - x) * w + y
+                    const size_t from = turns == 1   ? (h - 1 - x) * w + y
                                         : turns == 2 ? (h - 1 - y) * w + w - 1 - x
                                                      : x * w + w - 1 - y;
                     const auto at = upright.begin() + static_cast<ptrdiff_t>(from * size);
@@ -258,8 +259,8 @@ TEST_F(GifReduction, turned_one_to_one_rows_of_formats_5_7_and_8_run_forward) {
             const Bytes output = checked_decode(bytes, request).output;
             const Bytes upright = checked_decode(bytes, own_size(5, 3, format)).output;
             // The last row starts at its own place and runs on through the buffer.
-            const int64_t start = turns == 1 ? 0 : turns == 2 ? 4 : 14;
-            for (int64_t x = 0; x < 5 && start + x < 15; ++x)
+            const ptrdiff_t start = turns == 1 ? 0 : turns == 2 ? 4 : 14;
+            for (ptrdiff_t x = 0; x < 5 && start + x < 15; ++x)
                 EXPECT_TRUE(std::equal(output.begin() + (start + x) * 4, output.begin() + (start + x + 1) * 4,
                                        upright.begin() + (10 + x) * 4))
                     << request.described() << ", column " << x;

@@ -116,7 +116,9 @@ TEST_F(GifSources, a_full_buffer_whose_reads_come_full_is_used_to_its_last_byte)
     const Bytes file = large_file();
     for (size_t more = 0; more < 300; more += quick_gif_run() ? 37 : 1) { // moves every block across the buffer's end
         GifFile moved;
-        moved.raw({file.begin(), file.begin() + 13 + 768}).raw(Bytes(more, 0)).raw({file.begin() + 13 + 768, file.end()});
+        moved.raw({file.begin(), file.begin() + 13 + 768})
+            .raw(Bytes(more, 0))
+            .raw({file.begin() + 13 + 768, file.end()});
         EXPECT_EQ(gif_difference(moved.bytes, {1, 0, 0, 30, 20}), "") << more;
     }
 }

@@ -115,8 +115,8 @@ int32_t SideBySide::modelled(GifCall which, int32_t rows) {
 }
 
 std::string SideBySide::call(GifCall which, int32_t rows) {
-    const GifBufferShape placed = gif_buffer_shape(std::max(1u, little(file_, 6)), std::max(1u, little(file_, 8)),
-                                                   request_);
+    const GifBufferShape placed =
+        gif_buffer_shape(std::max(1u, little(file_, 6)), std::max(1u, little(file_, 8)), request_);
     const GifBufferShape lines{request_.box_width, rows, placed.pixel_bytes};
     // Lines come anew with every call; everything else is written into one buffer.
     if (setting_.no_output)

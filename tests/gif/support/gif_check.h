@@ -30,7 +30,7 @@ struct GifSetting {
     uint32_t kind = PELM_SOURCE_MEMORY;
     int32_t most_per_read = INT32_MAX;
     Edge edge = Edge::end;
-    size_t bytes_behind = 0; // between the output and the inaccessible page: gives it any alignment
+    size_t bytes_behind = 0;    // between the output and the inaccessible page: gives it any alignment
     bool has_raw_table = false; // word 20 names a buffer of the caller's
     bool no_output = false;
 };

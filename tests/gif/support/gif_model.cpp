@@ -91,8 +91,8 @@ int32_t GifModel::begin(bool animated, Style style) {
         return -1;
     }
     const GifSize &scaled = decoder_->scaled;
-    words.size_known = scaled.width == static_cast<int32_t>(scaled.width) &&
-                       scaled.height == static_cast<int32_t>(scaled.height);
+    words.size_known =
+        scaled.width == static_cast<int32_t>(scaled.width) && scaled.height == static_cast<int32_t>(scaled.height);
     words.output_width = static_cast<int32_t>(scaled.width);
     words.output_height = static_cast<int32_t>(scaled.height);
     if (style == Style::animated) {

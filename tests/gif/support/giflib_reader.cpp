@@ -61,8 +61,11 @@ std::optional<GiflibFile> read_with_giflib(const Bytes &file) {
     if (gif == nullptr) return std::nullopt;
     std::optional<GiflibFile> read;
     if (DGifSlurp(gif) == GIF_OK) {
-        read = GiflibFile{static_cast<uint16_t>(gif->SWidth), static_cast<uint16_t>(gif->SHeight),
-                          static_cast<uint8_t>(gif->SBackGroundColor), table_of(gif->SColorMap), {}};
+        read = GiflibFile{static_cast<uint16_t>(gif->SWidth),
+                          static_cast<uint16_t>(gif->SHeight),
+                          static_cast<uint8_t>(gif->SBackGroundColor),
+                          table_of(gif->SColorMap),
+                          {}};
         GraphicControl control;
         for (int i = 0; i < gif->ImageCount; ++i) {
             read->images.push_back(image_of(gif, i, control));
@@ -86,8 +89,7 @@ std::vector<fs::path> shared_gifs() {
     for (const auto &entry : fs::directory_iterator(folder, absent))
         if (entry.path().extension() == ".gif") found.push_back(entry.path());
     std::sort(found.begin(), found.end());
-    if (found.empty())
-        std::cout << "not tested: there are no GIF files in " << folder << "; set PELM_TEST_IMAGES\n";
+    if (found.empty()) std::cout << "not tested: there are no GIF files in " << folder << "; set PELM_TEST_IMAGES\n";
     return found;
 }
 

@@ -10,8 +10,8 @@ namespace pelm::test {
 
 struct GiflibImage {
     ImagePlace place;
-    ColourTable local; // empty: none
-    Bytes indices;     // rows from the top down
+    ColourTable local;      // empty: none
+    Bytes indices;          // rows from the top down
     GraphicControl control; // the last one before the image
 };
 

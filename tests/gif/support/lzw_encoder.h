@@ -26,7 +26,7 @@ constexpr uint32_t first_free_code(int min_code_size) {
 struct LzwOptions {
     bool begins_with_clear = true;
     bool ends = true;
-    size_t clear_every = 0;     // codes between clear codes; 0: only when the table is full
+    size_t clear_every = 0; // codes between clear codes; 0: only when the table is full
     bool clears_full_table = true;
     bool literals_only = false; // roots, one for each pixel
 };

@@ -25,7 +25,7 @@ struct ModelInput {
     bool at_end() const { return delivered == file->size(); }
     uint8_t take() { return held[used++]; }
     uint32_t take_word();
-    void refill();          // keeps what is left, reads once to fill the rest
+    void refill();           // keeps what is left, reads once to fill the rest
     bool need(size_t count); // refills when there is less; false when that is not enough
 };
 
@@ -133,7 +133,7 @@ private:
     int bit_count = 0;
     uint32_t block_left = 0;
     size_t pixel_count = 0;
-    std::vector<uint8_t> pixels; // as long as image width + 4096, or the screen's when that is more
+    std::vector<uint8_t> pixels;    // as long as image width + 4096, or the screen's when that is more
     std::optional<int32_t> outcome; // of data that ended before the first pixel
 
     int64_t rows_out = 0;
