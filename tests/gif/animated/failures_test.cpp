@@ -1,6 +1,6 @@
 // Animations that end too early, hosts without memory, absurd screens.
-#include "gif/state.h"
 #include "tests/gif/animated/frames.h"
+#include "tests/gif/support/gif_blocks.h"
 
 namespace pelm::test {
 namespace {
@@ -16,11 +16,9 @@ Animation two_frames() {
 
 std::vector<uint32_t> listed_blocks(bool with_tables) {
     std::vector<uint32_t> blocks;
-    if (with_tables) blocks = {1024, 1024};
-    for (const size_t size : {sizeof(GifDecoderState), sizeof(GifInput), size_t{16384}, size_t{1024}, size_t{1024},
-                              sizeof(GifLzwTables), size_t{16384}, size_t{4096}, size_t{16384}, size_t{width + 4096},
-                              size_t{width * 4}, size_t{width * height * 4}})
-        blocks.push_back(static_cast<uint32_t>(size));
+    if (with_tables) blocks = gif_request_tables;
+    for (const uint32_t size : gif_animated_blocks(width, height))
+        blocks.push_back(size);
     return blocks;
 }
 

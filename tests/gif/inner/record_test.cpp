@@ -1,5 +1,6 @@
 // The record: what is allocated for it, and the size and place that are settled when it is made.
 #include "tests/gif/inner/decoding_record.h"
+#include "tests/gif/support/gif_blocks.h"
 
 namespace pelm::test {
 namespace {
@@ -24,8 +25,7 @@ TEST_F(GifRecord, creating_allocates_in_order) {
     GifDecoderState *const state = static_cast<GifDecoderState *>(ZOTARPELM_OsMalloc(sizeof(GifDecoderState)));
     *state = GifDecoderState{};
     EXPECT_NE(PELMI_CreateGIFDecoderInfo(state), 0);
-    EXPECT_EQ(host.allocations, (std::vector<uint32_t>{sizeof(GifDecoderState), sizeof(GifInput), 16384, 1024, 1024,
-                                                       sizeof(GifLzwTables), 16384, 4096, 16384}));
+    EXPECT_EQ(host.allocations, gif_record_blocks());
     EXPECT_EQ(state->input->bytesLeft, 0);
     EXPECT_EQ(state->input->source, nullptr);
     PELMI_DelGIFDecoderInfo(state);

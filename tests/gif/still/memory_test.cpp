@@ -1,5 +1,5 @@
 // What still decodes allocate, in which order, and what happens when it fails.
-#include "gif/state.h"
+#include "tests/gif/support/gif_blocks.h"
 #include "tests/gif/support/gif_check.h"
 
 namespace pelm::test {
@@ -8,9 +8,7 @@ namespace {
 constexpr GifCall stills[] = {GifCall::one_shot, GifCall::iterative, GifCall::line};
 
 std::vector<uint32_t> listed_blocks(uint32_t screen_width, uint32_t image_width) {
-    std::vector<uint32_t> blocks{
-        sizeof(GifDecoderState), sizeof(GifInput), 16384, 1024, 1024, sizeof(GifLzwTables), 16384, 4096, 16384,
-        screen_width + 4096,     screen_width * 4};
+    std::vector<uint32_t> blocks = gif_still_blocks(screen_width);
     if (image_width > screen_width) blocks.push_back(image_width + 4096);
     return blocks;
 }

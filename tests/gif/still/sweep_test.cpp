@@ -10,6 +10,12 @@ uint32_t cases(uint32_t all) {
     return quick_gif_run() ? all / 25 : all;
 }
 
+// Boxes of some size in which one side of the reduced picture vanishes have a test of their own.
+bool reduces_to_nothing(uint16_t width, uint16_t height, const GifRequest &request) {
+    const GifSize size = gif_scaled_size(width, height, request);
+    return request.box_width > 0 && request.box_height > 0 && (size.width == 0 || size.height == 0);
+}
+
 class RandomGif {
 public:
     explicit RandomGif(uint32_t seed) : noise_(seed) {}
@@ -57,11 +63,7 @@ public:
         return setting;
     }
 
-    // Boxes of some size in which one side of the reduced picture vanishes have a test of their own.
-    bool vanishes(const GifRequest &request) const {
-        const GifSize size = gif_scaled_size(width_, height_, request);
-        return request.box_width > 0 && request.box_height > 0 && (size.width == 0 || size.height == 0);
-    }
+    bool vanishes(const GifRequest &request) const { return reduces_to_nothing(width_, height_, request); }
 
     uint32_t below(uint32_t limit) { return noise_.below(limit); }
 
@@ -154,6 +156,53 @@ TEST_F(GifSweep, random_code_streams_do_as_the_model) {
         }
         file.data(size, packed, static_cast<uint8_t>(1 + noise.below(255))).trailer();
         EXPECT_EQ(gif_difference(file.bytes, own_size(20, 40, 1), stills[seed % 3], {}, 7), "") << "seed " << seed;
+    }
+}
+
+// Runs of every length: strings get long, and so do rows that one of them completes.
+Bytes runs(size_t count, uint32_t colours, uint32_t longest, Noise &noise) {
+    Bytes pixels;
+    while (pixels.size() < count)
+        pixels.insert(pixels.end(), 1 + (noise.next() >> 8) % longest,
+                      static_cast<uint8_t>((noise.next() >> 8) % colours));
+    pixels.resize(count);
+    return pixels;
+}
+
+TEST_F(GifSweep, long_streams_that_break_late_do_as_the_model) {
+    const uint32_t seeds = cases(2500);
+    for (uint32_t seed = 0; seed < seeds && !HasFailure(); ++seed) {
+        Noise noise(seed + 555);
+        const auto below = [&noise](uint32_t limit) { return (noise.next() >> 6) % limit; };
+        const int size = static_cast<int>(2 + below(7));
+        const uint16_t width = static_cast<uint16_t>(1 + below(below(3) == 0 ? 9 : 90));
+        const uint16_t height = static_cast<uint16_t>(1 + below(120));
+        const LzwOptions options{.begins_with_clear = below(6) > 0,
+                                 .clear_every = below(2) == 0 ? 0 : 20 + below(900),
+                                 .clears_full_table = below(3) > 0};
+        Codes codes = lzw_codes(runs(size_t{width} * height, 1u << size, 1 + below(40), noise), size, options);
+        for (uint32_t breaks = below(4); breaks > 0; --breaks) {
+            const size_t at = below(static_cast<uint32_t>(codes.size()));
+            const auto place = codes.begin() + static_cast<ptrdiff_t>(at);
+            const uint32_t any = below(1u << code_widths(codes, size)[at]);
+            switch (below(4)) {
+            case 0: *place = any == end_code(size) ? 0 : any; break;
+            case 1: codes.insert(place, any == end_code(size) ? 0 : any); break;
+            case 2: codes.insert(place, {clear_code(size), first_free_code(size) + below(clear_code(size) - 2)}); break;
+            default: codes.erase(place);
+            }
+            if (codes.empty()) codes.push_back(end_code(size));
+        }
+        GifFile file;
+        const uint16_t screen_width = below(3) == 0 ? static_cast<uint16_t>(width + below(20)) : width;
+        file.screen(screen_width, height, distinct_table(256)).descriptor({0, 0, width, height, below(5) == 0});
+        file.data(size, packed_codes(codes, size), static_cast<uint8_t>(below(3) == 0 ? 1 + below(40) : 255)).trailer();
+        const GifRequest request = below(2) == 0 ? own_size(screen_width, height, gif_formats[below(8)])
+                                                 : GifRequest{gif_formats[below(8)], below(4), 0, 40, 30};
+        if (reduces_to_nothing(screen_width, height, request)) continue;
+        const GifCall call = stills[seed % 3];
+        EXPECT_EQ(gif_difference(file.bytes, request, call, {}, static_cast<int32_t>(1 + below(20))), "")
+            << "seed " << seed;
     }
 }
 
