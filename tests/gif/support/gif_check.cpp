@@ -9,7 +9,7 @@ namespace pelm::test {
 
 namespace {
 
-constexpr int most_calls = 20000;
+constexpr int most_calls = 100000;
 constexpr uint8_t behind_output = 0x77;
 constexpr size_t raw_table_size = 1024;
 
