@@ -208,8 +208,10 @@ TEST_F(GifFrames, tables_of_every_kind_colour_their_own_frames) {
             file.image(place, all, 8, distinct_table(entries, static_cast<uint32_t>(entries)));
             file.image(place, all, 8);
         }
-        for (const GifCall call : frame_calls)
-            EXPECT_EQ(frames_of(file.trailer().bytes, {1, 0, 0, 16, 16}, call).size(), 16u);
+        file.trailer();
+        for (const uint32_t format : gif_formats)
+            for (const GifCall call : frame_calls)
+                EXPECT_EQ(frames_of(file.bytes, {format, 0, 0, 16, 16}, call).size(), 16u);
     }
 }
 

@@ -197,6 +197,27 @@ TEST_F(GifFrameFailures, sources_and_short_reads_give_the_same_frames) {
             }
 }
 
+TEST_F(GifFrameFailures, long_frames_that_may_be_broken_do_as_the_model) {
+    const uint32_t seeds = quick_gif_run() ? 20 : 300;
+    for (uint32_t seed = 0; seed < seeds && !HasFailure(); ++seed) {
+        Noise noise(seed + 8888);
+        const auto below = [&noise](uint32_t limit) { return (noise.next() >> 6) % limit; };
+        Animation animation{70, 90, static_cast<int>(2 + below(7)), 1, {}, true, seed};
+        for (uint32_t i = 0; i < 4; ++i) {
+            const uint16_t columns = static_cast<uint16_t>(1 + below(70)), rows = static_cast<uint16_t>(2 + below(88));
+            Frame frame{{static_cast<uint16_t>(below(9)), static_cast<uint16_t>(below(9)), columns, rows, i == 2},
+                        {static_cast<uint8_t>(below(4)), static_cast<int>(below(4)) - 1}};
+            frame.pixels = pixel_runs(size_t{columns} * rows, 1u << animation.bits, 1 + below(60), noise);
+            animation.frames.push_back(frame);
+        }
+        Bytes file = animation.file();
+        for (uint32_t i = below(2) == 0 ? 1 + below(3) : 0; i > 0; --i)
+            file[file.size() / 2 + below(static_cast<uint32_t>(file.size() / 2))] = static_cast<uint8_t>(below(256));
+        const GifRequest box{gif_formats[below(8)], below(4), 0, below(2) == 0 ? 90 : 41, below(2) == 0 ? 90 : 33};
+        EXPECT_EQ(gif_difference(file, box, frame_calls[seed % 2]), "") << "seed " << seed;
+    }
+}
+
 TEST_F(GifFrameFailures, random_animations_do_as_the_model) {
     const uint32_t seeds = quick_gif_run() ? 100 : 3000;
     for (uint32_t seed = 0; seed < seeds && !HasFailure(); ++seed) {

@@ -114,6 +114,15 @@ TEST_F(GifLine, no_rows_asked_for_begins_and_writes_nothing) {
     }
 }
 
+TEST_F(GifLine, an_interlaced_image_is_refused_when_its_first_row_is_asked_for) {
+    SideBySide both(still_file({6, 4, 8, true}).bytes, own_size(6, 4));
+    EXPECT_EQ(both.call(GifCall::line, 0), "");
+    EXPECT_EQ(both.result(), 1);
+    EXPECT_EQ(both.call(GifCall::line, 1), "");
+    EXPECT_EQ(both.result(), 0);
+    EXPECT_TRUE(host.live_blocks().empty());
+}
+
 TEST_F(GifLine, an_end_code_with_rows_missing_succeeds_once_and_then_fails) {
     GifFile file;
     file.screen(6, 9, table).descriptor({0, 0, 6, 9}).data(8, lzw_data(noise_pixels(6 * 5, 256, 2), 8)).trailer();

@@ -159,16 +159,6 @@ TEST_F(GifSweep, random_code_streams_do_as_the_model) {
     }
 }
 
-// Runs of every length: strings get long, and so do rows that one of them completes.
-Bytes runs(size_t count, uint32_t colours, uint32_t longest, Noise &noise) {
-    Bytes pixels;
-    while (pixels.size() < count)
-        pixels.insert(pixels.end(), 1 + (noise.next() >> 8) % longest,
-                      static_cast<uint8_t>((noise.next() >> 8) % colours));
-    pixels.resize(count);
-    return pixels;
-}
-
 TEST_F(GifSweep, long_streams_that_break_late_do_as_the_model) {
     const uint32_t seeds = cases(2500);
     for (uint32_t seed = 0; seed < seeds && !HasFailure(); ++seed) {
@@ -180,7 +170,7 @@ TEST_F(GifSweep, long_streams_that_break_late_do_as_the_model) {
         const LzwOptions options{.begins_with_clear = below(6) > 0,
                                  .clear_every = below(2) == 0 ? 0 : 20 + below(900),
                                  .clears_full_table = below(3) > 0};
-        Codes codes = lzw_codes(runs(size_t{width} * height, 1u << size, 1 + below(40), noise), size, options);
+        Codes codes = lzw_codes(pixel_runs(size_t{width} * height, 1u << size, 1 + below(40), noise), size, options);
         for (uint32_t breaks = below(4); breaks > 0; --breaks) {
             const size_t at = below(static_cast<uint32_t>(codes.size()));
             const auto place = codes.begin() + static_cast<ptrdiff_t>(at);

@@ -125,6 +125,15 @@ Bytes noise_pixels(size_t count, uint32_t colours, uint32_t seed) {
     return pixels;
 }
 
+Bytes pixel_runs(size_t count, uint32_t colours, uint32_t longest, Noise &noise) {
+    Bytes pixels;
+    while (pixels.size() < count)
+        pixels.insert(pixels.end(), 1 + (noise.next() >> 8) % longest,
+                      static_cast<uint8_t>((noise.next() >> 8) % colours));
+    pixels.resize(count);
+    return pixels;
+}
+
 Bytes still_pixels(const Still &still) {
     return noise_pixels(size_t{still.width} * still.height, 1u << still.bits, still.seed);
 }

@@ -65,6 +65,9 @@ Bytes interlaced_pixels(const Bytes &pixels, uint32_t width);
 // Indices below `colours`, in runs here and there.
 Bytes noise_pixels(size_t count, uint32_t colours, uint32_t seed);
 
+// Runs of up to `longest` pixels: strings get long, and so do the rows that one of them completes.
+Bytes pixel_runs(size_t count, uint32_t colours, uint32_t longest, Noise &noise);
+
 // A whole file: one image that fills the screen.
 struct Still {
     uint16_t width = 8, height = 8;

@@ -53,7 +53,8 @@ GifSize gif_scaled_size(int64_t w, int64_t h, const GifRequest &request) {
 
 size_t GifBufferShape::bytes() const {
     if (row_pixels <= 0 || rows <= 0) return 0;
-    const int64_t most_pixels = INT64_MAX / pixel_bytes; // absurd sizes: more than any memory has, and no more than that
+    const int64_t most_pixels =
+        INT64_MAX / pixel_bytes; // absurd sizes: more than any memory has, and no more than that
     return row_pixels > most_pixels / rows ? SIZE_MAX : static_cast<size_t>(row_pixels * rows * pixel_bytes);
 }
 
