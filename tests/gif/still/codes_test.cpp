@@ -27,6 +27,15 @@ protected:
         for (const GifCall call : stills)
             EXPECT_EQ(gif_difference(file, own_size(width, 1, 1), call, {}, 1), "");
         EXPECT_EQ(checked_decode(file, own_size(width, 1, 1)).output, rgb_of(indices, table));
+        expect_on_a_wider_screen(file, width);
+    }
+    // There, what lies behind the row shows as well: pixels that were decoded and moved on.
+    static void expect_on_a_wider_screen(Bytes file, uint16_t width) {
+        const uint16_t wider = static_cast<uint16_t>(width + 5);
+        file[6] = static_cast<uint8_t>(wider);
+        file[7] = static_cast<uint8_t>(wider >> 8);
+        for (const GifCall call : stills)
+            EXPECT_EQ(gif_difference(file, own_size(wider, 1, 1), call, {}, 1), "");
     }
     static void expect_as_modelled(const Bytes &file, uint16_t width, uint16_t height) {
         for (const GifCall call : stills)
@@ -132,35 +141,43 @@ TEST_F(GifCodes, the_code_behind_a_clear_code_is_a_root_without_a_check) {
     expect_as_modelled(code_row(40, 2, {4, 0, 1, 2, 8, 9, 10, 4, 7, 6, 0, 6, 7, 8, 9, 5}), 40, 1);
 }
 
-TEST_F(GifCodes, strings_that_grow_beyond_the_table_decode_as_code_zero) {
-    // Every repetition makes a string longer by one; a clear code keeps them, and the unchecked root goes on from
-    // there.
+TEST_F(GifCodes, strings_from_before_a_clear_code_can_begin_longer_ones) {
+    // Every repetition makes a string longer by one. A clear code keeps them: roots are 3 bits wide, and 7 is a string
+    // of three pixels, from which each round goes on.
     Codes codes = {4, 0};
-    for (uint32_t code = 6; code < 4096; ++code)
-        codes.push_back(code);
-    // Roots are 3 bits wide: 7 is a string of three. Each round of codes makes it longer than all before.
-    for (int round = 0; round < 3; ++round) {
-        codes.insert(codes.end(), {4, 7});
-        for (uint32_t code = 6; code < 4096; ++code)
+    for (int round = 0; round < 4; ++round) {
+        for (uint32_t code = 6; code < 400; ++code)
             codes.push_back(code);
+        codes.insert(codes.end(), {4, 7});
     }
     GifFile file;
-    file.screen(900, 4000, table).descriptor({0, 0, 900, 4000}).data(2, packed_codes(codes, 2)).trailer();
-    expect_as_modelled(file.bytes, 900, 4000);
-    // With minimum code size 11 every code can be such a root: 4095 has the longest string.
-    Codes wide = {2048, 5};
+    file.screen(90, 3600, table).descriptor({0, 0, 90, 3600}).data(2, packed_codes(codes, 2)).trailer();
+    expect_as_modelled(file.bytes, 90, 3600);
+}
+
+TEST_F(GifCodes, a_string_of_more_than_4096_pixels_counts_as_code_zero) {
+    // With minimum code size 11 every code fits the width of roots. 4095 has the longest string after each round, and
+    // the unchecked root 4095 behind a clear code makes it the beginning of longer ones.
+    Codes codes = {2048, 5};
     for (uint32_t code = 2050; code < 4096; ++code)
-        wide.push_back(code);
-    for (int round = 0; round < 3; ++round) {
-        wide.insert(wide.end(), {2048, 4095, 5});
-        for (uint32_t code = 2051; code < 4096; ++code)
-            wide.push_back(code);
-        wide.insert(wide.end(), {4095, 4095, 9});
+        codes.push_back(code); // each is the string before and one pixel: 2 to 2047 pixels
+    codes.insert(codes.end(), {2048, 4095, 5, 2050});
+    for (uint32_t code = 2052; code < 4096; ++code)
+        codes.push_back(code);                                          // 2049 to 4092 pixels
+    codes.insert(codes.end(), {2048, 4095, 5, 2050, 2052, 2053, 2054}); // 4093 to 4096 pixels
+    const Codes longest = {2055};                                       // 4096 and one more
+    for (const Codes &behind : {Codes{2055, 9}, Codes{2055, 2056, 9, 2057}, Codes{2056, 9, 2056, 2057},
+                                Codes{2056, 2057, 2058, 2055, 7}, Codes{9, 2055, 2055, 2060, 2060}}) {
+        Codes all = codes;
+        all.insert(all.end(), longest.begin(), longest.end());
+        all.insert(all.end(), behind.begin(), behind.end());
+        all.push_back(2049);
+        GifFile file;
+        file.screen(4000, 2150, table).descriptor({0, 0, 4000, 2150}).data(11, packed_codes(all, 11)).trailer();
+        const GifOutcome outcome = checked_decode(file.bytes, {1, 0, 0x700, 40, 2150});
+        EXPECT_EQ(outcome.output[outcome.output.size() - 1], 0) << "the string was reached, and the data ended";
+        EXPECT_EQ(gif_difference(file.bytes, {1, 0, 0x700, 40, 2150}, GifCall::iterative), "");
     }
-    GifFile longer;
-    longer.screen(4000, 3000, table).descriptor({0, 0, 4000, 3000}).data(11, packed_codes(wide, 11)).trailer();
-    EXPECT_EQ(gif_difference(longer.bytes, {1, 0, 0, 40, 30}, GifCall::one_shot), "");
-    EXPECT_EQ(gif_difference(longer.bytes, {1, 0, 0, 40, 30}, GifCall::line, {}, 30), "");
 }
 
 TEST_F(GifCodes, strings_may_be_much_longer_than_a_row) {

@@ -69,7 +69,6 @@ void ModelDecoder::put_root(uint32_t code) {
 }
 
 uint8_t ModelDecoder::put_string(uint32_t code) {
-    if (entries[code].length > longest_string) code = 0;
     const size_t start = pixel_count;
     pixel_count += entries[code].length;
     for (size_t at = pixel_count; at > start; --at) {
@@ -97,9 +96,10 @@ Read ModelDecoder::decode_code() {
     if (code == clear_code + 1) return Read::ended_well;
     uint32_t joined = previous;
     if (code < next_entry) {
+        if (entries[code].length > longest_string) code = 0;
         first_pixel_of_string = put_string(code);
     } else {
-        if (previous >= next_entry) joined = 0;
+        if (previous >= next_entry || entries[previous].length > longest_string) joined = 0;
         put_string(joined);
         put(first_pixel_of_string);
     }
