@@ -13,9 +13,9 @@ fail() {
     failures=$((failures + 1))
 }
 
-# The names of all functions that a public header declares, sorted.
+# The names of all functions that public headers declare, sorted.
 declared_in() {
-    sed -nE 's/^PELM_API [^(]*[ *]([A-Za-z0-9_]+)\(.*/\1/p' "$root/include/$1" | sort
+    sed -nE 's/^PELM_API [^(]*[ *]([A-Za-z0-9_]+)\(.*/\1/p' "${@/#/$root/include/}" | sort
 }
 
 expected_symbols() { # of the decoder library
@@ -93,7 +93,7 @@ decoder)
     is_well_linked libPelmImageDecoder.so.1
     ;;
 host)
-    exports_exactly < <(declared_in PelmHost.h)
+    exports_exactly < <(declared_in PelmAnimation.h PelmHost.h)
     is_well_linked libPelmHost.so.1
     ;;
 esac
