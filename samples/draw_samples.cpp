@@ -3,6 +3,8 @@
 #include <cstdio>
 
 #include "samples/bmp_writer.h"
+#include "samples/gif_writer.h"
+#include "samples/lighthouse.h"
 #include "samples/png_writer.h"
 #include "samples/quantise.h"
 #include "samples/scene.h"
@@ -143,9 +145,23 @@ bool write_wbmp_of(const std::string &path, const Drawing &scene) {
     return write_wbmp(path, scene.width, scene.height, indexed(scene, 1, {{0, 0, 0}, {255, 255, 255}}).values);
 }
 
+GifContents gif(const Drawing &drawing, size_t colours, bool interlaced) {
+    const BmpContents stored = indexed(drawing, 8, suitable_palette(drawing, colours));
+    GifFrame frame{0, 0, drawing.width, drawing.height, {stored.values.begin(), stored.values.end()}};
+    frame.interlaced = interlaced;
+    return {drawing.width, drawing.height, stored.palette, {frame}};
+}
+
+bool write_gifs(const std::string &folder, const Drawing &scene) {
+    return write_gif(folder + "/sunset.gif", gif(scene, 256, false)) &&
+           write_gif(folder + "/sunset-interlaced.gif", gif(scene, 16, true)) &&
+           write_gif(folder + "/lighthouse.gif", draw_lighthouse());
+}
+
 bool write_all(const std::string &folder) {
     const Drawing scene = draw_scene();
-    return write_bmps(folder, scene) && write_pngs(folder, scene) && write_wbmp_of(folder + "/sunset.wbmp", scene);
+    return write_bmps(folder, scene) && write_pngs(folder, scene) && write_gifs(folder, scene) &&
+           write_wbmp_of(folder + "/sunset.wbmp", scene);
 }
 
 } // namespace

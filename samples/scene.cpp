@@ -204,9 +204,9 @@ Colour with_rock(Colour behind, Point p) {
 }
 
 // The lamp's beam points to the upper left.
-Colour with_beam(Colour behind, Point p) {
+Colour with_beam(Colour behind, Point p, int rise) {
     const int left = 262 * q - p.x;
-    const int off = std::abs(p.y - (68 * q - left / 5));
+    const int off = std::abs(p.y - (68 * q - left * rise / 100));
     const int spread = 2 * q + left / 12;
     if (left <= 0 || off > spread) return behind;
     return mix(behind, {255, 246, 190}, (spread - off) * std::max(0, 150 - left / 8) / spread);
@@ -234,19 +234,20 @@ Colour with_lettering(Colour behind, Point p) {
     return pelm_tool::dot_of_text(text, x, y) ? Colour{255, 226, 170} : behind;
 }
 
-Colour scene_at(Point p) {
+Colour scene_at(Point p, Moment moment) {
     Colour colour = p.y < horizon ? sky_at(p) : sea_at(p);
-    if (p.y < horizon) colour = with_birds(with_beam(colour, p), p);
+    if (p.y < horizon) colour = with_birds(with_beam(colour, p, moment.beam_rise), p);
     colour = with_lighthouse(colour, p);
     colour = with_rock(colour, p);
-    colour = with_boat_shadow(colour, p);
-    return with_lettering(with_boat(colour, p), p);
+    const Point from_boat = {p.x + moment.sailed * q, p.y};
+    colour = with_boat_shadow(colour, from_boat);
+    return with_lettering(with_boat(colour, from_boat), p);
 }
 
-Colour pixel_at(int x, int y) {
+Colour pixel_at(int x, int y, Moment moment) {
     Colour sum = {0, 0, 0};
     for (int i = 0; i < q * q; ++i) {
-        const Colour point = scene_at({x * q + i % q, y * q + i / q});
+        const Colour point = scene_at({x * q + i % q, y * q + i / q}, moment);
         sum = {sum.r + point.r, sum.g + point.g, sum.b + point.b};
     }
     return {sum.r / (q * q), sum.g / (q * q), sum.b / (q * q)};
@@ -254,11 +255,11 @@ Colour pixel_at(int x, int y) {
 
 } // namespace
 
-Drawing draw_scene() {
+Drawing draw_scene(Moment moment) {
     Drawing drawing{width, height, {}};
     for (int y = 0; y < height; ++y) {
         for (int x = 0; x < width; ++x)
-            drawing.pixels.push_back(pixel_at(x, y));
+            drawing.pixels.push_back(pixel_at(x, y, moment));
     }
     return drawing;
 }

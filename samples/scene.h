@@ -5,6 +5,12 @@
 
 namespace pelm_samples {
 
-Drawing draw_scene(); // 320 x 240
+// What moves.
+struct Moment {
+    int beam_rise = 20; // of the lighthouse's beam, in hundredths of its length
+    int sailed = 0;     // by the boat to the left, in pixels
+};
+
+Drawing draw_scene(Moment moment = {}); // 320 x 240
 
 } // namespace pelm_samples

@@ -32,7 +32,7 @@ Image through_565(const Image &image) {
 TEST_F(ToolSamples, are_what_the_generator_draws) {
     ASSERT_EQ(shell(std::string(PELM_DRAW_SAMPLES) + " '" + path("") + "'").status, 0);
     std::vector<std::filesystem::path> samples = bmp_samples();
-    for (const char *const suffix : {".png", ".wbmp"}) {
+    for (const char *const suffix : {".png", ".gif", ".wbmp"}) {
         const auto others = files_with_suffix(PELM_SAMPLES, suffix);
         samples.insert(samples.end(), others.begin(), others.end());
     }
