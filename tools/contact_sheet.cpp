@@ -6,6 +6,7 @@
 
 #include "tools/decode.h"
 #include "tools/failure.h"
+#include "tools/output_file.h"
 #include "tools/tiny_font.h"
 #include "tools/writers.h"
 

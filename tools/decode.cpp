@@ -3,52 +3,13 @@
 #include <cerrno>
 #include <new>
 
+#include "tools/blank_picture.h"
 #include "tools/failure.h"
 #include "tools/interrupt.h"
 #include "tools/png_decode.h"
 
 namespace pelm_tool {
 namespace {
-
-constexpr uint64_t largest_output = uint64_t{1} << 31; // bytes
-
-bool is_quarter_turn(const Options &options) {
-    return options.rotation == PELM_ROTATE_90 || options.rotation == PELM_ROTATE_270;
-}
-
-Box box_for(const Options &options, const ImageDescription &image) {
-    if (options.box) return *options.box;
-    if (is_quarter_turn(options)) return {image.height, image.width};
-    return {image.width, image.height};
-}
-
-std::string size_words(int64_t width, int64_t height) {
-    return std::to_string(width) + "x" + std::to_string(height);
-}
-
-void refuse_huge(const Box &box, const PixelFormat &format) {
-    const uint64_t bytes =
-        static_cast<uint64_t>(box.width) * static_cast<uint64_t>(box.height) * static_cast<uint64_t>(format.bytes);
-    if (static_cast<uint64_t>(box.width) * static_cast<uint64_t>(box.height) > largest_output ||
-        bytes > largest_output) {
-        throw Failure("an output of " + size_words(box.width, box.height) + " pixels is larger than 2 GiB");
-    }
-}
-
-Picture blank_picture(const Options &options, int32_t width, int32_t height) {
-    Picture picture{options.format, static_cast<size_t>(width), static_cast<size_t>(height), {}};
-    try {
-        picture.bytes.resize(picture.width * picture.height * options.format->bytes);
-    } catch (const std::exception &) { // bad_alloc, or length_error where addresses have 32 bits
-        throw Failure("not enough memory for an output of " + size_words(width, height) + " pixels");
-    }
-    if (options.background) {
-        const uint32_t rgb = *options.background;
-        fill(picture, {static_cast<uint8_t>(rgb >> 16), static_cast<uint8_t>(rgb >> 8 & 0xFF),
-                       static_cast<uint8_t>(rgb & 0xFF), 255});
-    }
-    return picture;
-}
 
 // What to decode, and with what.
 struct Decoding {
@@ -71,11 +32,6 @@ uint32_t flags_of(const Decoding &decoding) {
     const bool framed =
         decoding.options.frame_buffer || (decoding.description.is_interlaced && !keeps_its_size(decoding));
     return framed ? flags | PELM_INTERLACE_FRAME : flags;
-}
-
-std::string memory_failure(const Options &options) {
-    if (options.max_memory == 0) return "not enough memory";
-    return "the decoder needs more memory than --max-memory allows";
 }
 
 std::string rows_of_all(const Decoding &decoding, int64_t rows) {
@@ -109,7 +65,7 @@ Failure refusal_of(const Decoding &decoding, const DecodeJob &job) {
 // The library also reports success when it had to leave rows out, so success is looked at as well.
 void throw_if_failed(const Decoding &decoding, const DecodeJob &job, int32_t result) {
     decoding.session.throw_if_stopped();
-    if (decoding.session.counters().failedAllocations > 0) throw Failure(memory_failure(decoding.options));
+    decoding.session.throw_if_out_of_memory();
     decoding.input.throw_if_unreadable();
     if (result != PELM_RESULT_DONE) throw refusal_of(decoding, job);
 }
@@ -154,6 +110,10 @@ std::vector<std::string> notes_on(const Decoding &decoding) {
     std::vector<std::string> notes = decoding.description.notes;
     if (decoding.image.black_is_clear && decoding.options.format->has_alpha && keeps_its_size(decoding))
         notes.push_back("the decoder writes black as transparent; use --format rgb");
+    if (decoding.image.notes != nullptr) {
+        const auto more = decoding.image.notes(decoding.options, decoding.description, decoding.box);
+        notes.insert(notes.end(), more.begin(), more.end());
+    }
     if (!decoding.image.turns_only_reduced) return notes;
     const bool keeps_size = keeps_its_size(decoding);
     const bool is_grey_8 = decoding.description.is_grey_8;
@@ -171,6 +131,7 @@ int32_t Session::on_progress(void *session, const InputSource *source) {
     Session &self = *static_cast<Session *>(session);
     const bool is_poll = source == nullptr;
     if (is_poll) ++self.polls_;
+    if (self.frames_shown_ > 0) return 0;
     if (self.rows_shown_ > 0) {
         self.progress_.at(static_cast<double>(self.polls_) / self.rows_shown_);
     } else if (!is_poll && source->size > 0) {
@@ -179,7 +140,12 @@ int32_t Session::on_progress(void *session, const InputSource *source) {
     return 0;
 }
 
-Session::Session(const Options &options, Progress &progress) : control_(PelmHost_NewControl()), progress_(progress) {
+void Session::frames_done(size_t count) {
+    progress_.at(static_cast<double>(count) / static_cast<double>(frames_shown_));
+}
+
+Session::Session(const Options &options, Progress &progress)
+    : control_(PelmHost_NewControl()), progress_(progress), has_memory_limit_(options.max_memory != 0) {
     if (control_ == nullptr) throw std::bad_alloc();
     PelmHost_SetMemoryLimits(control_, options.max_memory, 0);
     PelmHost_SetDeadline(control_, options.deadline);
@@ -205,6 +171,11 @@ void Session::throw_if_stopped() const {
     if (PelmHost_StopReason(control_) == ETIMEDOUT) throw Failure("not done before the deadline");
 }
 
+void Session::throw_if_out_of_memory() const {
+    if (counters().failedAllocations == 0) return;
+    throw Failure(has_memory_limit_ ? "the decoder needs more memory than --max-memory allows" : "not enough memory");
+}
+
 Decoded decode(Input &input, const ImageFormat &image, const ImageDescription &description, const Options &options,
                Session &session) {
     if (!description.refusal.empty()) throw Failure(description.refusal);
@@ -223,7 +194,7 @@ Decoded decode(Input &input, const ImageFormat &image, const ImageDescription &d
     if (image.polls_rows) session.show_rows(description.height);
     Picture picture = blank_picture_for(decoding);
     const RunResult result = run(decoding, &picture);
-    return {std::move(picture), shortage_after(decoding, result), notes_on(decoding)};
+    return {std::move(picture), {shortage_after(decoding, result), notes_on(decoding)}};
 }
 
 } // namespace pelm_tool

@@ -20,25 +20,36 @@ public:
     Session &operator=(const Session &) = delete;
 
     PelmHostCounters counters() const;
-    void throw_if_stopped() const; // Failure: interrupted, or the deadline has passed
+    void throw_if_stopped() const;       // Failure: interrupted, or the deadline has passed
+    void throw_if_out_of_memory() const; // Failure: the decoder asked for memory and got none
 
     // What the progress line shows: rows of this many, as the decoder polls, instead of bytes of the input.
     void show_rows(int32_t count) { rows_shown_ = count; }
     const uint64_t &polls() const { return polls_; } // so far
+    // The same for an animation of `count` frames.
+    void show_frames(size_t count) { frames_shown_ = count; }
+    void frames_done(size_t count);
 
 private:
     static int32_t on_progress(void *session, const InputSource *source);
 
     PelmHostControl *control_;
     Progress &progress_;
+    bool has_memory_limit_;
     int32_t rows_shown_ = 0; // 0: bytes
     uint64_t polls_ = 0;
+    size_t frames_shown_ = 0; // 0: none
+};
+
+// What there is to say about a picture that was decoded.
+struct Remarks {
+    std::string shortage;           // what is missing of it; empty: nothing
+    std::vector<std::string> notes; // what the user may not expect
 };
 
 struct Decoded {
     Picture picture;
-    std::string shortage;           // what is missing of the image; empty: nothing
-    std::vector<std::string> notes; // what the user may not expect
+    Remarks remarks;
 };
 
 // Throws Failure.

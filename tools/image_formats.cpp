@@ -5,6 +5,8 @@
 
 #include "tools/bmp_description.h"
 #include "tools/failure.h"
+#include "tools/gif_decode.h"
+#include "tools/gif_description.h"
 #include "tools/png_decode.h"
 #include "tools/png_description.h"
 #include "tools/wbmp_description.h"
@@ -19,6 +21,8 @@ constexpr uint32_t common_formats = 1u << PELM_FORMAT_RGB565 | 1u << PELM_FORMAT
 
 constexpr uint32_t wbmp_formats =
     1u << PELM_FORMAT_RGB565 | 1u << PELM_FORMAT_RGB888 | 1u << PELM_FORMAT_RGBA8888 | 1u << PELM_FORMAT_BGRA8888;
+constexpr uint32_t gif_formats = (common_formats & ~(1u << PELM_FORMAT_RGB565_A8)) | 1u << PELM_FORMAT_BGR565 |
+                                 1u << PELM_FORMAT_BGR888 | 1u << PELM_FORMAT_BGRX8888;
 
 bool begins_with(Bytes head, const char *magic) {
     const size_t length = std::strlen(magic);
@@ -27,10 +31,6 @@ bool begins_with(Bytes head, const char *magic) {
 
 bool is_bmp(Bytes head) {
     return begins_with(head, "BM");
-}
-
-bool is_gif(Bytes head) {
-    return begins_with(head, "GIF8");
 }
 
 ImageDescription describe_bmp_input(Input &input) {
@@ -43,6 +43,10 @@ ImageDescription describe_png_input(Input &input) {
 
 ImageDescription describe_wbmp_input(Input &input) {
     return describe_wbmp(input.head(), {input.size(), input.source()->kind});
+}
+
+ImageDescription describe_gif_input(Input &input) {
+    return describe_gif(*input.source(), input.head());
 }
 
 int32_t decode_bmp(DecodeJob &job) {
@@ -65,7 +69,14 @@ int32_t decode_wbmp(DecodeJob &job) {
 constexpr ImageFormat image_formats[] = {
     {"BMP", is_bmp, describe_bmp_input, decode_bmp, common_formats, false, false, false, false},
     {"PNG", begins_like_png, describe_png_input, decode_png, common_formats, true, true, true, true},
-    {"GIF", is_gif, nullptr, nullptr, 0, false, false, false, false},
+    {.name = "GIF",
+     .recognises = begins_like_gif,
+     .describe = describe_gif_input,
+     .decode = decode_gif,
+     .written_formats = gif_formats,
+     .decodes_in_calls = true,
+     .has_frames = true,
+     .notes = gif_notes},
     {.name = "WBMP",
      .recognises = begins_like_wbmp,
      .describe = describe_wbmp_input,
@@ -81,11 +92,9 @@ constexpr ImageFormat image_formats[] = {
 const ImageFormat &recognise(Bytes head) {
     if (head.empty()) throw Failure("the file is empty");
     for (const ImageFormat &format : image_formats) {
-        if (!format.recognises(head)) continue;
-        if (format.describe == nullptr) throw Failure(std::string(format.name) + " images are not decoded yet");
-        return format;
+        if (format.recognises(head)) return format;
     }
-    throw Failure("not a BMP, PNG or WBMP file (it begins like none of them)");
+    throw Failure("not a BMP, PNG, GIF or WBMP file (it begins like none of them)");
 }
 
 ImageDescription describe(const ImageFormat &image, Input &input) {

@@ -11,16 +11,19 @@ namespace pelm_tool {
 struct ImageFormat {
     const char *name;
     bool (*recognises)(Bytes head);
-    ImageDescription (*describe)(Input &input); // nullptr: known, but not decoded
-    int32_t (*decode)(DecodeJob &job);          // PELM_RESULT_
-    uint32_t written_formats;                   // bit n: output format n
-    bool is_read_from_memory = false;           // unless the user says otherwise
-    bool polls_rows = false;                    // asks the host once after every row
-    bool decodes_in_calls = false;              // modes other than one-shot
+    ImageDescription (*describe)(Input &input);
+    int32_t (*decode)(DecodeJob &job); // PELM_RESULT_
+    uint32_t written_formats;          // bit n: output format n
+    bool is_read_from_memory = false;  // unless the user says otherwise
+    bool polls_rows = false;           // asks the host once after every row
+    bool decodes_in_calls = false;     // modes other than one-shot
     bool turns_only_reduced = false;
     bool never_turns = false;
     bool needs_seeks = false;    // from a pipe: its bytes are given as a stream that can seek
     bool black_is_clear = false; // alpha 0, at the image's own size
+    bool has_frames = false;     // of an animation
+    // What it does to this image with these options, beyond what the description says.
+    std::vector<std::string> (*notes)(const Options &options, const ImageDescription &image, Box box) = nullptr;
 };
 
 // By the first bytes. Throws Failure, with the reason, for what cannot be decoded.

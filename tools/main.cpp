@@ -4,11 +4,13 @@
 #include <cstdio>
 #include <exception>
 
+#include "tools/animation_page.h"
 #include "tools/decode.h"
 #include "tools/failure.h"
+#include "tools/frame_files.h"
+#include "tools/gif_frames.h"
 #include "tools/interrupt.h"
 #include "tools/output_names.h"
-#include "tools/writers.h"
 
 namespace pelm_tool {
 namespace {
@@ -24,29 +26,46 @@ int exit_status(Outcome outcome) {
     return 1;
 }
 
-class Milliseconds {
+class Stopwatch {
 public:
-    double passed() const {
-        return std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() - start_).count();
-    }
+    void start() { start_ = Clock::now(); }
+    void stop() { passed_ += Clock::now() - start_; }
+    double milliseconds() const { return passed_.count(); }
 
 private:
-    std::chrono::steady_clock::time_point start_ = std::chrono::steady_clock::now();
+    using Clock = std::chrono::steady_clock;
+    Clock::time_point start_;
+    std::chrono::duration<double, std::milli> passed_{0};
+};
+
+// One input, described.
+struct Work {
+    Input &input;
+    const ImageFormat &format;
+    const ImageDescription &image;
+    Session &session;
+    Stopwatch &stopwatch; // of the decoder, without the writing
 };
 
 class Run {
 public:
     explicit Run(const Options &options) : options_(options), progress_(!options.quiet, options.inputs.size()) {
-        if (!options.info) outputs_ = output_names(options);
+        if (options.all_frames) frame_output_name(options, 0); // throws where it will later
+        if (!options.info && !options.all_frames && options.page.empty()) outputs_ = output_names(options);
     }
 
     Outcome all();
 
 private:
     Outcome one(size_t index);
-    Outcome decode_one(const std::string &name, const OutputName *output); // throws
+    Outcome decode_one(const std::string &name, const OutputName *output); // throws; nullptr: the options say where
     Outcome describe_one(const std::string &name, const ImageDescription &image);
     void write(const Picture &picture, const OutputName &to);
+    Remarks decode_still(const Work &work, const OutputName &output);
+    Remarks play_one(const Work &work, const OutputName *output);
+    Remarks play_with(const Work &work, const TakeFrame &take);
+    Remarks write_frames(const Work &work);
+    Remarks write_page(const Work &work);
     void tell(const std::string &name, const std::string &what);
     void warn(const std::string &name, const std::string &of);
     void tell_stats(const std::string &name, double milliseconds, const PelmHostCounters &counters);
@@ -75,12 +94,7 @@ void Run::tell_stats(const std::string &name, double milliseconds, const PelmHos
 
 void Run::write(const Picture &picture, const OutputName &to) {
     OutputFile file(to.path);
-    switch (to.type) {
-    case OutputType::png: write_png(file, picture); break;
-    case OutputType::ppm: write_ppm(file, picture); break;
-    case OutputType::pam: write_pam(file, picture); break;
-    case OutputType::raw: write_raw(file, picture); break;
-    }
+    write_picture(file, picture, to.type);
     throw_if_interrupted();
     file.commit();
 }
@@ -91,10 +105,57 @@ Outcome Run::describe_one(const std::string &name, const ImageDescription &image
     if (!image.shortage.empty()) line += "; truncated: " + image.shortage;
     for (const std::string &note : image.notes)
         line += "; note: " + note;
+    for (const std::string &detail : image.details)
+        line += "\n  " + detail;
     progress_.clear();
     std::puts(line.c_str());
     if (!image.refusal.empty()) return Outcome::failed;
     return image.shortage.empty() ? Outcome::done : Outcome::truncated;
+}
+
+Remarks Run::decode_still(const Work &work, const OutputName &output) {
+    work.stopwatch.start();
+    const Decoded decoded = decode(work.input, work.format, work.image, options_, work.session);
+    work.stopwatch.stop();
+    write(decoded.picture, output);
+    return decoded.remarks;
+}
+
+Remarks Run::play_with(const Work &work, const TakeFrame &take) {
+    work.stopwatch.start();
+    const auto take_untimed = [&](const Picture &picture, size_t index, uint32_t delay) {
+        work.stopwatch.stop();
+        take(picture, index, delay);
+        throw_if_interrupted();
+        work.stopwatch.start();
+    };
+    const Remarks remarks = play(work.input, work.format, work.image, options_, work.session, take_untimed);
+    work.stopwatch.stop();
+    return remarks;
+}
+
+Remarks Run::write_frames(const Work &work) {
+    FrameFiles files(options_);
+    const Remarks remarks =
+        play_with(work, [&](const Picture &picture, size_t index, uint32_t) { files.add(picture, index); });
+    files.commit();
+    return remarks;
+}
+
+Remarks Run::write_page(const Work &work) {
+    OutputFile file(options_.page);
+    AnimationPage page(file, shown_name(options_.inputs[0]));
+    const Remarks remarks =
+        play_with(work, [&](const Picture &picture, size_t, uint32_t delay) { page.add(picture, delay); });
+    page.finish(work.image.animation.plays);
+    file.commit();
+    return remarks;
+}
+
+Remarks Run::play_one(const Work &work, const OutputName *output) {
+    if (options_.all_frames) return write_frames(work);
+    if (!options_.page.empty()) return write_page(work);
+    return play_with(work, [&](const Picture &picture, size_t, uint32_t) { write(picture, *output); });
 }
 
 Outcome Run::decode_one(const std::string &name, const OutputName *output) {
@@ -104,20 +165,19 @@ Outcome Run::decode_one(const std::string &name, const OutputName *output) {
     input.settle(format.is_read_from_memory, format.needs_seeks);
     const ImageDescription image = describe(format, input);
     session.throw_if_stopped();
-    if (output == nullptr) return describe_one(name, image);
+    if (options_.info) return describe_one(name, image);
 
     const uint64_t reads_before = session.counters().reads;
-    const Milliseconds clock;
-    const Decoded decoded = decode(input, format, image, options_, session);
-    const double milliseconds = clock.passed();
-    write(decoded.picture, *output);
+    Stopwatch stopwatch;
+    const Work work{input, format, image, session, stopwatch};
+    const Remarks remarks = options_.wants_frames() ? play_one(work, output) : decode_still(work, *output);
     PelmHostCounters counters = session.counters();
     counters.reads -= reads_before;
-    if (options_.stats) tell_stats(name, milliseconds, counters);
-    for (const std::string &note : decoded.notes)
+    if (options_.stats) tell_stats(name, stopwatch.milliseconds(), counters);
+    for (const std::string &note : remarks.notes)
         warn(name, note);
-    if (decoded.shortage.empty()) return Outcome::done;
-    warn(name, decoded.shortage);
+    if (remarks.shortage.empty()) return Outcome::done;
+    warn(name, remarks.shortage);
     return Outcome::truncated;
 }
 
@@ -125,7 +185,7 @@ Outcome Run::one(size_t index) {
     const std::string &name = options_.inputs[index];
     progress_.start_input(index, name);
     try {
-        return decode_one(name, options_.info ? nullptr : &outputs_[index]);
+        return decode_one(name, outputs_.empty() ? nullptr : &outputs_[index]);
     } catch (const std::bad_alloc &) {
         tell(name, "not enough memory");
     } catch (const std::exception &error) {

@@ -16,36 +16,45 @@ constexpr const char *description = "Decodes images with the Pelm image decoder 
                                     "raw pixels.";
 
 constexpr const char *remarks = R"(
-Inputs: BMP, PNG and WBMP files; "-" is standard input. With several inputs OUTPUT is a folder, or has %n (1, 2, ...)
-or %f (the input's name without folder and suffix) in it. "%%" is a percent sign. OUTPUT "-" is standard output.
+Inputs: BMP, PNG, GIF and WBMP files; "-" is standard input. With several inputs OUTPUT is a folder, or has %n (1, 2,
+...) or %f (the input's name without folder and suffix) in it. "%%" is a percent sign. OUTPUT "-" is standard output.
 
-Sources: a PNG is decoded from memory. A BMP is read as a seekable file when it is a named one, as a pipe otherwise. A
-pipe is first read to its end into memory, then decoded front to back. The decoder takes the rows of a BMP pipe from
-right behind the headers, whatever the header says, and writes those of a top-down BMP upwards: use --source memory
-for such files. From file or pipe some PNGs cannot be decoded (a chunk begins across the decoder's buffer). A WBMP is
-read as a seekable file, also with --source pipe, or from memory when it comes through a pipe.
+Animations (GIF): without further options the first image is decoded as it is stored, without its place on the screen
+and without transparency. --frame and --all-frames compose each frame with those before it; with --all-frames %n is
+the number of the frame, and either all files are written or none. --animate writes one HTML file that holds all
+frames and plays them with their delays (what lies below 20 ms is shown for 100, as browsers do) as often as the file
+says; opened as PAGE#3 it shows the third frame. What no frame has painted yet is clear in rgba and white otherwise,
+also with --background.
 
-Modes (PNG): oneshot decodes in one call, iter block by block, line=N by calls for N rows each; the picture is the
-same. iter turns to oneshot when the first block brings no row, and to line=16 for grey of 8 bits that is reduced.
+Sources: a PNG is decoded from memory. The others are read as a seekable file when it is a named one, as a pipe
+otherwise. A pipe is first read to its end into memory, then decoded front to back. The decoder takes the rows of a
+BMP pipe from right behind the headers, whatever the header says, and writes those of a top-down BMP upwards: use
+--source memory for such files. From file or pipe some PNGs cannot be decoded (a chunk begins across the decoder's
+buffer). A WBMP is read as a seekable file, also with --source pipe, or from memory when it comes through a pipe.
+
+Modes (PNG, GIF): oneshot decodes in one call, iter block by block, line=N by calls for N rows each; the picture is
+the same. iter turns to oneshot when the first block brings no row, and to line=16 for grey of 8 bits that is reduced.
 An interlaced PNG cannot be decoded by lines; reduced, it goes through the frame buffer, where in rgb565 and rgb only
-transparency by tRNS lets the background through.
+transparency by tRNS lets the background through. A GIF can be decoded by lines only as it lies, neither interlaced
+nor turned, and not frame by frame.
 
 Placement: fit reduces the image to the box (it never enlarges), keeps its shape and centres it. stretch fills the
-box. exact reduces as fit does; the output is just the image. With exact and a quarter turn the decoder does not
-swap width and height of the output, and what lies outside is cut off. A PNG is turned only when it is reduced or
+box. exact reduces as fit does; the output is just the image. With exact and a quarter turn the decoder does not swap
+width and height of the output, and what lies outside is cut off. A PNG is turned only when it is reduced or
 stretched, and never when it is grey of 8 bits; reduced, that kind fills only a part of its place. In rgb565 a turn by
-270 degrees shifts a PNG that is not square. The decoder does so; the tool warns of the first two. A WBMP cannot be
-turned. Its odd margins have their larger half left and above.
+270 degrees shifts a PNG that is not square. A GIF at its own size is not turned in argb, rgba and bgra: use rgb or
+bgrx. The decoder does so; the tool warns, but for the shift. A WBMP cannot be turned. Its odd margins have their
+larger half left and above.
 
 Background: what the image does not cover is black and, in formats with alpha, transparent; with --background it is
 opaque in that colour. In rgb565 and rgb, which have no alpha, a PNG with transparency lies over it.
 
-Formats: bgr565, bgr and bgrx exist for GIF only. A BMP that is reduced or stretched has red and blue exchanged in
-rgb565a: the decoder writes it so. WBMP has rgb565, rgb, rgba and bgra; at its own size black is transparent in the
-last two (the tool warns), reduced or stretched white is 252 of 255.
+Formats: bgr565, bgr and bgrx exist for GIF only, and rgb565a for BMP and PNG. A BMP that is reduced or stretched has
+red and blue exchanged in rgb565a: the decoder writes it so. WBMP has rgb565, rgb, rgba and bgra; at its own size
+black is transparent in the last two (the tool warns), reduced or stretched white is 252 of 255.
 
-Exit status: 0 done; 1 failed, no output; 2 done, but pixels are missing. With several inputs the
-worst: 1, then 2, then 0.)";
+Exit status: 0 done; 1 failed, no output; 2 done, but pixels are missing. With several inputs the worst: 1, then 2,
+then 0.)";
 
 CLI::ValidationError mistake(const std::string &option, const std::string &value, const char *expected) {
     return CLI::ValidationError(option, "\"" + value + "\" is not " + expected);
@@ -190,18 +199,45 @@ void add_files(CLI::App &app, Options &options) {
 }
 
 void check_output(const Options &options) {
-    if (options.output.empty() && !options.info) throw CLI::ValidationError("-o OUTPUT is required");
-    if (!options.output.empty() && options.info) throw CLI::ValidationError("--info writes no output: leave out -o");
+    const bool has_output = !options.output.empty();
+    if (!has_output && !options.info && options.page.empty()) throw CLI::ValidationError("-o OUTPUT is required");
+    if (has_output && options.info) throw CLI::ValidationError("--info writes no output: leave out -o");
+}
+
+void check_frames(const Options &options) {
+    const int wishes = (options.frame > 0 ? 1 : 0) + (options.all_frames ? 1 : 0) + (options.page.empty() ? 0 : 1);
+    if (wishes == 0) return;
+    if (wishes > 1) throw CLI::ValidationError("only one of --frame, --all-frames and --animate at a time");
+    if (options.info) throw CLI::ValidationError("--info lists all frames: leave out --frame, --all-frames, --animate");
+    if (!options.page.empty() && !options.output.empty())
+        throw CLI::ValidationError("--animate writes its own file: leave out -o");
+    if (options.frame == 0 && options.inputs.size() > 1)
+        throw CLI::ValidationError("--all-frames and --animate take one INPUT");
 }
 
 // The help text with a synopsis of our own: CLI11 does not count OUTPUT among the required.
 class HelpFormatter : public CLI::Formatter {
 public:
     std::string make_usage(const CLI::App *, std::string) const override {
-        return "\nUsage: pelm-decode [OPTIONS] INPUT... -o OUTPUT\n       pelm-decode --info INPUT...\n";
+        return "\nUsage: pelm-decode [OPTIONS] INPUT... -o OUTPUT\n       pelm-decode [OPTIONS] INPUT --animate "
+               "PAGE.html\n"
+               "       pelm-decode --info INPUT...\n";
     }
     std::string make_positionals(const CLI::App *) const override { return {}; }
 };
+
+uint32_t parse_frame(const std::string &text) {
+    const auto number = to_number<uint32_t>(text);
+    if (!number || *number == 0) throw mistake("--frame", text, "the number of a frame, from 1 on");
+    return *number;
+}
+
+void add_animation_options(CLI::App &app, Options &options) {
+    add_parsed(app, "--frame", options.frame, parse_frame, "N", "This frame of an animation, composed; the first is 1");
+    app.add_flag("--all-frames", options.all_frames, "Every frame of an animation; OUTPUT has %n in it or is a folder");
+    app.add_option("--animate", options.page, "Write a web page that plays the animation, instead of OUTPUT")
+        ->type_name("PAGE.html");
+}
 
 int tell_mistake(const CLI::ParseError &error) {
     std::fprintf(stderr, "pelm-decode: %s (see pelm-decode --help)\n", error.what());
@@ -219,11 +255,13 @@ std::optional<int> parse_options(int argc, char **argv, Options &options) {
     app.formatter(formatter);
     app.footer(remarks);
     add_files(app, options);
+    add_animation_options(app, options);
     add_picture_options(app, options);
     add_run_options(app, options);
     try {
         app.parse(argc, argv);
         check_output(options);
+        check_frames(options);
     } catch (const CLI::CallForHelp &) {
         std::fputs(app.help().c_str(), stdout);
         return 0;

@@ -27,7 +27,10 @@ enum class OutputType { png, ppm, pam, raw };
 
 struct Options {
     std::vector<std::string> inputs;
-    std::string output; // as given; empty with --info
+    std::string output; // as given; empty with --info and --animate
+    std::string page;   // of --animate; empty: none
+    uint32_t frame = 0; // of an animation, from 1 on; 0: not asked for
+    bool all_frames = false;
     std::optional<OutputType> output_type;
     const PixelFormat *format = find_pixel_format("rgba");
     std::optional<Box> box; // measured in the output; none: the image's own size
@@ -42,6 +45,8 @@ struct Options {
     bool info = false;
     bool stats = false;
     bool quiet = false;
+
+    bool wants_frames() const { return frame > 0 || all_frames || !page.empty(); }
 };
 
 // Fills `options`, or says what there is to say (help, version, a mistake) and returns the status to end with.

@@ -75,10 +75,15 @@ void OutputFile::write(const void *bytes, size_t size) {
     }
 }
 
-void OutputFile::commit() {
+void OutputFile::finish() {
+    if (descriptor_ < 0) return;
     const int descriptor = descriptor_;
     descriptor_ = -1;
     if (close(descriptor) != 0 && errno != EINTR) throw cannot_write(path_, errno);
+}
+
+void OutputFile::commit() {
+    finish();
     if (temporary_.empty()) return;
     if (std::rename(temporary_.c_str(), path_.c_str()) != 0) throw cannot_write(path_, errno);
     temporary_.clear();

@@ -5,17 +5,22 @@
 #include <cstddef>
 #include <string>
 
+#include "tools/output.h"
+
 namespace pelm_tool {
 
-class OutputFile {
+class OutputFile final : public Output {
 public:
     explicit OutputFile(const std::string &path); // throws Failure
     ~OutputFile();                                // without commit, nothing stays behind
     OutputFile(const OutputFile &) = delete;
     OutputFile &operator=(const OutputFile &) = delete;
 
-    void write(const void *bytes, size_t size); // throws Failure
-    void commit();                              // throws Failure; nothing may be written afterwards
+    void write(const void *bytes, size_t size) override; // throws Failure
+    // Nothing may be written after either; both throw Failure. Many files can wait finished until all of them are
+    // committed.
+    void finish();
+    void commit();
 
 private:
     void open_temporary(unsigned mode);

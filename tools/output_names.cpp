@@ -75,7 +75,21 @@ void refuse_twins(const Options &options, const std::vector<OutputName> &names) 
     }
 }
 
+std::string frame_path(const Options &options, size_t frame) {
+    const std::string &input = options.inputs[0];
+    if (!is_folder(options.output)) return expand(options.output, input, frame);
+    const std::string suffix = suffix_of(options.output_type.value_or(OutputType::png));
+    return (fs::path(options.output) / (base_name(input) + "-" + std::to_string(frame + 1) + suffix)).string();
+}
+
 } // namespace
+
+OutputName frame_output_name(const Options &options, size_t frame) {
+    if (frame_path(options, 0) == frame_path(options, 1))
+        throw Failure("every frame would be written to \"" + options.output + "\"; use %n or a folder in -o");
+    const std::string path = frame_path(options, frame);
+    return {path, type_of(options, path)};
+}
 
 std::vector<OutputName> output_names(const Options &options) {
     std::vector<OutputName> names;

@@ -13,7 +13,7 @@ namespace {
 
 // What libpng's callbacks work with. They may not throw through libpng: the exception waits here for write_png.
 struct Job {
-    OutputFile &output;
+    Output &output;
     const Picture &picture;
     std::vector<uint8_t> row;
     std::exception_ptr failure;
@@ -69,7 +69,7 @@ bool run(png_structp png, png_infop info, Job &job) {
 
 } // namespace
 
-void write_png(OutputFile &output, const Picture &picture) {
+void write_png(Output &output, const Picture &picture) {
     Job job{output, picture, std::vector<uint8_t>(picture.width * channels_of(picture)), nullptr, {}};
     png_structp png = png_create_write_struct(PNG_LIBPNG_VER_STRING, &job, on_error, on_warning);
     png_infop info = png != nullptr ? png_create_info_struct(png) : nullptr;

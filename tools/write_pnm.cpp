@@ -8,7 +8,7 @@
 namespace pelm_tool {
 namespace {
 
-void write_rows(OutputFile &output, const Picture &picture, size_t channels) {
+void write_rows(Output &output, const Picture &picture, size_t channels) {
     std::vector<uint8_t> row(picture.width * channels);
     for (size_t y = 0; y < picture.height; ++y) {
         throw_if_interrupted();
@@ -19,14 +19,14 @@ void write_rows(OutputFile &output, const Picture &picture, size_t channels) {
 
 } // namespace
 
-void write_ppm(OutputFile &output, const Picture &picture) {
+void write_ppm(Output &output, const Picture &picture) {
     const std::string header =
         "P6\n" + std::to_string(picture.width) + " " + std::to_string(picture.height) + "\n255\n";
     output.write(header.data(), header.size());
     write_rows(output, picture, 3);
 }
 
-void write_pam(OutputFile &output, const Picture &picture) {
+void write_pam(Output &output, const Picture &picture) {
     const size_t channels = channels_of(picture);
     const std::string header = "P7\nWIDTH " + std::to_string(picture.width) + "\nHEIGHT " +
                                std::to_string(picture.height) + "\nDEPTH " + std::to_string(channels) +
@@ -35,7 +35,7 @@ void write_pam(OutputFile &output, const Picture &picture) {
     write_rows(output, picture, channels);
 }
 
-void write_raw(OutputFile &output, const Picture &picture) {
+void write_raw(Output &output, const Picture &picture) {
     output.write(picture.bytes.data(), picture.bytes.size());
 }
 

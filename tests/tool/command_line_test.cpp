@@ -13,9 +13,12 @@ TEST_F(ToolCommandLine, help_goes_to_standard_output) {
         const ToolRun got = run({option});
         EXPECT_EQ(got.status, 0);
         EXPECT_EQ(got.err, "");
-        for (const char *const word : {"Usage: pelm-decode", "--box", "--place", "--rotate", "--format", "--source",
-                                       "--mode", "--background", "--info", "--max-memory", "--deadline", "--stats",
-                                       "--quiet", "--output-type", "--version", "%n", "%f", "Exit status"}) {
+        for (const char *const word :
+             {"Usage: pelm-decode", "--box",         "--place",      "--rotate", "--format",
+              "--source",           "--mode",        "--background", "--info",   "--max-memory",
+              "--deadline",         "--stats",       "--quiet",      "--frame",  "--all-frames",
+              "--animate",          "--output-type", "--version",    "%n",       "%f",
+              "Exit status"}) {
             EXPECT_NE(got.out.find(word), std::string::npos) << word;
         }
     }
@@ -62,6 +65,17 @@ TEST_F(ToolCommandLine, mistakes_are_told_in_one_line) {
         {in, "-o", out, "--max-memory", "lots"},
         {in, "-o", out, "--max-memory", "99999999999999999M"},
         {in, "-o", out, "--deadline", "0"},
+        {in, "-o", out, "--frame", "0"},
+        {in, "-o", out, "--frame", "x"},
+        {in, "-o", out, "--all-frames"},
+        {in, "-o", "-", "--all-frames"},
+        {in, "--all-frames"},
+        {in, in, "-o", path("%n.png"), "--all-frames"},
+        {in, in, "--animate", path("x.html")},
+        {in, "-o", out, "--animate", path("x.html")},
+        {in, "--info", "--animate", path("x.html")},
+        {in, "--info", "--frame", "1"},
+        {in, "-o", path("%n.png"), "--all-frames", "--frame", "1"},
         {in, "-o", out, "--info"},
         {in, "-o", path("x.jpg")},
         {in, "-o", path("x")},
