@@ -3,10 +3,6 @@
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
-#include <cstdlib>
-#include <filesystem>
-#include <fstream>
-#include <functional>
 #include <memory>
 #include <string>
 
@@ -14,27 +10,12 @@
 #include "bench/png_peers.h"
 #include "bench/png_pictures.h"
 #include "bench/stb_peer.h"
+#include "bench/work.h"
 
 namespace bench {
 namespace {
 
 namespace fs = std::filesystem;
-
-using Bytes = std::vector<uint8_t>;
-
-// Files that one iteration decodes, made or read when the first benchmark wants them, and kept.
-class Work {
-public:
-    explicit Work(std::function<std::vector<Bytes>()> make) : make_(std::move(make)) {}
-    const std::vector<Bytes> &files() {
-        if (files_.empty()) files_ = make_();
-        return files_;
-    }
-
-private:
-    std::function<std::vector<Bytes>()> make_;
-    std::vector<Bytes> files_;
-};
 
 uint32_t word_at(const Bytes &file, size_t at) {
     return uint32_t{file[at]} << 24 | uint32_t{file[at + 1]} << 16 | uint32_t{file[at + 2]} << 8 | file[at + 3];
@@ -129,33 +110,13 @@ void add_picture(const std::string &name, Motif motif, Stored stored, uint32_t w
         }));
 }
 
-fs::path image_folder() {
-    const char *const chosen = std::getenv("PELM_TEST_IMAGES");
-    return chosen != nullptr ? chosen : PELM_SHARED_IMAGES;
-}
-
-Bytes read_file(const fs::path &path) {
-    std::ifstream stream(path, std::ios::binary);
-    return Bytes(std::istreambuf_iterator<char>(stream), {});
-}
-
-// Sorted, so that runs are alike.
-std::vector<fs::path> pngs_in(const fs::path &folder) {
-    std::vector<fs::path> paths;
-    std::error_code missing;
-    for (const auto &entry : fs::directory_iterator(folder, missing))
-        if (entry.path().extension() == ".png") paths.push_back(entry.path());
-    std::sort(paths.begin(), paths.end());
-    return paths;
-}
-
 bool is_interlaced(const Bytes &png) {
     constexpr size_t interlace_at = 28;
     return png.size() <= interlace_at || png[interlace_at] != 0;
 }
 
 void add_photos() {
-    for (const fs::path &path : pngs_in(image_folder())) {
+    for (const fs::path &path : files_with_suffix(image_folder(), ".png")) {
         const Bytes png = read_file(path);
         if (is_interlaced(png)) continue;
         add(path.stem().string(), std::make_shared<Work>([=] { return std::vector<Bytes>{png}; }));
@@ -166,7 +127,7 @@ void add_photos() {
 // files.
 void add_icons() {
     std::vector<Bytes> icons;
-    for (const fs::path &path : pngs_in(image_folder() / "pngsuite")) {
+    for (const fs::path &path : files_with_suffix(image_folder() / "pngsuite", ".png")) {
         Bytes png = read_file(path);
         const bool is_icon = path.filename().string()[0] != 'x' && !is_interlaced(png) && width_of(png) <= 64;
         if (is_icon) icons.push_back(std::move(png));

@@ -147,6 +147,15 @@ PngLayout layout_of(Stored stored) {
 
 } // namespace
 
+std::vector<uint8_t> rgb_row(Motif motif, uint32_t y, uint32_t first_x, uint32_t width) {
+    std::vector<uint8_t> row;
+    for (uint32_t x = first_x; x < first_x + width; ++x) {
+        const Pixel p = pixel_of(motif, x, y);
+        append(row, {p.r, p.g, p.b});
+    }
+    return row;
+}
+
 std::vector<uint8_t> png_picture(Motif motif, Stored stored, uint32_t width, uint32_t height) {
     return write_png(width, height, layout_of(stored), [&](uint32_t y, std::vector<uint8_t> &row) {
         for (uint32_t x = 0; x < width; ++x)

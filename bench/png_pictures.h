@@ -16,6 +16,9 @@ enum class Motif {
 
 enum class Stored { rgb, rgba, grey, palette, rgb16, grey1 };
 
+// The pixels of row `y` as red, green and blue.
+std::vector<uint8_t> rgb_row(Motif motif, uint32_t y, uint32_t first_x, uint32_t width);
+
 // Empty when libpng cannot write it.
 std::vector<uint8_t> png_picture(Motif motif, Stored stored, uint32_t width, uint32_t height);
 

@@ -28,4 +28,17 @@ bool stb_decode_rgba(const std::vector<uint8_t> &file) {
     return pixels != nullptr;
 }
 
+bool stb_decode_frames(const std::vector<uint8_t> &gif) {
+    int width = 0;
+    int height = 0;
+    int frames = 0;
+    int channels = 0;
+    int *delays = nullptr;
+    stbi_uc *const pixels = stbi_load_gif_from_memory(gif.data(), static_cast<int>(gif.size()), &delays, &width,
+                                                      &height, &frames, &channels, 4);
+    stbi_image_free(pixels);
+    stbi_image_free(delays);
+    return pixels != nullptr;
+}
+
 } // namespace bench

@@ -1,0 +1,8 @@
+// GIF against giflib and stb_image.
+#pragma once
+
+namespace bench {
+
+void add_gif_benchmarks();
+
+} // namespace bench
