@@ -86,6 +86,33 @@ TEST_F(ToolPage, holds_all_frames_their_delays_and_how_often_they_are_played) {
     EXPECT_EQ(files(), (std::set<std::string>{"x.gif", "page.html"}));
 }
 
+Bytes from_base64(const std::string &text) {
+    const std::string digits = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+    Bytes bytes;
+    uint32_t bits = 0;
+    for (size_t i = 0; i < text.size() && text[i] != '='; ++i) {
+        bits = bits << 6 | static_cast<uint32_t>(digits.find(text[i]));
+        if (i % 4 != 0) bytes.push_back(static_cast<uint8_t>(bits >> (6 - 2 * (i % 4))));
+    }
+    return bytes;
+}
+
+TEST_F(ToolPage, holds_the_pictures_that_the_frames_are) {
+    const std::string file = sample("lighthouse.gif").string();
+    ASSERT_EQ(run({file, "--animate", path("page.html")}).status, 0);
+    const Bytes bytes = read_file(path("page.html"));
+    const std::string page(bytes.begin(), bytes.end()), mark = "base64,";
+    size_t at = 0;
+    for (int number = 1; number <= 8; ++number) {
+        at = page.find(mark, at) + mark.size();
+        const std::string text = page.substr(at, page.find('"', at) - at);
+        EXPECT_EQ(text.size() % 4, 0u);
+        write("held.png", from_base64(text));
+        ASSERT_EQ(run({file, "--frame", std::to_string(number), "-o", path("frame.png")}).status, 0);
+        EXPECT_TRUE(read_file(path("held.png")) == read_file(path("frame.png"))) << "frame " << number;
+    }
+}
+
 TEST_F(ToolPage, needs_nothing_else) {
     const std::string page = page_of(colours_with_delays({7}));
     for (const char *const word : {"http:", "https:", "src=", "href=", "@import"})
