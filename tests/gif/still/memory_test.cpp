@@ -125,8 +125,7 @@ TEST_F(GifMemory, a_refused_header_leaves_nothing) {
         }
 }
 
-TEST_F(GifMemory, the_input_buffer_is_all_that_is_read) {
-    // Nothing but the reader's buffer grows with the file: blocks are the same for a file of several buffers.
+TEST_F(GifMemory, blocks_do_not_grow_with_the_file) {
     host.reset();
     int32_t result = -1;
     decode(still_file({300, 200, 8}).bytes, GifCall::one_shot, result);
