@@ -233,7 +233,7 @@ TEST_F(GifFrameFailures, random_animations_do_as_the_model) {
                             seed};
         for (uint32_t i = 1 + below(5); i > 0; --i) {
             Frame frame;
-            frame.place = {size(20), size(22), size(24), static_cast<uint16_t>(2 + below(22)), below(3) == 0};
+            frame.place = {size(20), size(22), size(24), size(24), below(3) == 0};
             if (below(3) == 0) frame.place = {0, 0, animation.width, animation.height};
             frame.control = {static_cast<uint8_t>(below(8)), static_cast<int>(below(5)) - 1, size(65535), 0};
             frame.has_control = below(5) > 0;

@@ -84,8 +84,7 @@ private:
         place.left = between(0, 30);
         place.top = between(0, one_in(2) ? 4 : 30);
         place.width = between(one_in(6) ? 0 : 1, 30);
-        // What a row beyond an interlaced image of one row does is left open.
-        place.height = between(one_in(6) ? 0 : 2, 30);
+        place.height = between(one_in(6) ? 0 : 1, 30);
         return place;
     }
     void add_data(GifFile &file, const ImagePlace &place, int bits) {
