@@ -57,7 +57,7 @@ void set_scaled_size(GifDecoderState &state, Size box, bool stretch) {
     state.oneToOne = scaling.one_to_one ? 1 : 0;
 }
 
-// False when the buffer or the steps in it are beyond what the record can hold.
+// False when the buffer, if there is one, or the steps in it are beyond what the record can hold.
 bool place_in_output(GifDecoderState &state, Size box, bool exact, void *out) {
     const int32_t pixel_bytes = GifFormats::size(state.outputFormat);
     const Size scaled = {state.scaledWidth, state.scaledHeight};
@@ -65,10 +65,10 @@ bool place_in_output(GifDecoderState &state, Size box, bool exact, void *out) {
     // "Exact placement of turned images").
     const Size buffer = exact ? scaled : box;
     size_t bytes = 0;
-    if (!buffer_bytes(buffer.width, buffer.height, pixel_bytes, bytes)) return false;
-    if (bytes == 0 || scaled.width <= 0 || scaled.height <= 0) return true; // nothing will be written
+    const bool fits = buffer_bytes(buffer.width, buffer.height, pixel_bytes, bytes);
+    if (fits && bytes == 0) return true; // nothing will be written
     BytePlacement placement{};
-    if (!place_bytes(state.rotation, buffer, scaled, pixel_bytes, placement)) return false;
+    if (!fits || !place_bytes(state.rotation, buffer, scaled, pixel_bytes, placement)) return out == nullptr;
     state.output = {static_cast<uint8_t *>(out), out == nullptr ? 0 : bytes};
     state.outputStart = placement.first;
     state.rowStep = placement.row_step / gif_step_unit(state.outputFormat);

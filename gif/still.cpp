@@ -104,7 +104,8 @@ int32_t ZOTARPELMI_DecodeGIFLine(ImageDecodeInfo *info, void *outBuffer, int32_t
     if (auto *const state = static_cast<GifDecoderState *>(info->decoderState))
         return state->startedBy == GIF_BY_LINES ? pelm::decode_lines(*info, state, outBuffer, rowsWanted, false)
                                                 : PELM_RESULT_FAILED;
-    GifDecoderState *const state = pelm::begin(*info, {outWidth, outHeight}, outBuffer, GIF_BY_LINES, true);
+    // The rows of a call go to a buffer of that call's own, however large the box is.
+    GifDecoderState *const state = pelm::begin(*info, {outWidth, outHeight}, nullptr, GIF_BY_LINES, true);
     if (state == nullptr) return PELM_RESULT_FAILED;
     pelm::begin_sampling(*state);
     return pelm::decode_lines(*info, state, outBuffer, rowsWanted, true);

@@ -9,7 +9,7 @@ constexpr GifCall stills[] = {GifCall::one_shot, GifCall::iterative, GifCall::li
 
 std::vector<uint32_t> listed_blocks(uint32_t screen_width, uint32_t image_width) {
     std::vector<uint32_t> blocks = gif_still_blocks(screen_width);
-    if (image_width > screen_width) blocks.push_back(image_width + 4096);
+    if (image_width > screen_width) blocks.push_back(image_width + 4104);
     return blocks;
 }
 

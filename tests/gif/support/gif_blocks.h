@@ -8,15 +8,15 @@
 
 namespace pelm::test {
 
-// The record and what is created with it.
+// The record and what is created with it; finished colours and fast tables lie behind two of the blocks.
 inline std::vector<uint32_t> gif_record_blocks() {
-    return {sizeof(GifDecoderState), sizeof(GifInput), 16384, 1024, 1024, sizeof(GifLzwTables), 16384, 4096, 16384};
+    return {sizeof(GifDecoderState), sizeof(GifInput), 16384, 1024, 2048, sizeof(GifLzwTables), 16384, 4096, 65536};
 }
 
 // And for a screen: pixels that wait for their row, the row; no more for stills.
 inline std::vector<uint32_t> gif_still_blocks(uint32_t screen_width) {
     std::vector<uint32_t> blocks = gif_record_blocks();
-    blocks.push_back(screen_width + 4096);
+    blocks.push_back(screen_width + 4104);
     blocks.push_back(screen_width * 4);
     return blocks;
 }
