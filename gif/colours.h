@@ -1,6 +1,7 @@
 // Packed colours, R << 20 | G << 10 | B, and the output formats that GIF writes.
 #pragma once
 
+#include <bit>
 #include <cstdint>
 #include <cstring>
 
@@ -47,10 +48,11 @@ struct StoreBgr888 {
 struct StoreCanvasRgba8888 {
     static constexpr int32_t size = 4;
     static void put(uint8_t *at, PackedColour colour) {
-        const Rgb c = channels_of(colour);
-        const uint32_t painted = colour.word == gif_never_painted ? 0 : 0xFF;
-        store_4(at, static_cast<uint8_t>(c.r & painted), static_cast<uint8_t>(c.g & painted),
-                static_cast<uint8_t>(c.b & painted), static_cast<uint8_t>(painted));
+        static_assert(std::endian::native == std::endian::little, "the first byte is the lowest");
+        const uint32_t c = colour.word; // as one word, in shifts and masks that vectors have too
+        const uint32_t opaque = (c >> 20 & 0xFF) | (c >> 2 & 0xFF00) | (c << 16 & 0xFF0000) | 0xFF000000;
+        const uint32_t pixel = opaque & (c == gif_never_painted ? 0 : 0xFFFFFFFF);
+        std::memcpy(at, &pixel, sizeof pixel);
     }
 };
 
