@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# shared_library.sh decoder|host FILE: what a built shared library offers to the dynamic linker and asks of it.
+# shared_library.sh decoder|host|testing FILE: what a built shared library offers to the dynamic linker and asks of it.
 # NM and READELF name the tools for its architecture.
 set -euo pipefail
 export LC_ALL=C
@@ -95,6 +95,13 @@ decoder)
 host)
     exports_exactly < <(declared_in PelmAnimation.h PelmHost.h)
     is_well_linked libPelmHost.so.1
+    ;;
+testing)
+    exports_exactly < <({
+        declared_in PelmHost.h | grep '^ZOTARPELM_'
+        declared_in PelmHostTesting.h
+    } | sort)
+    is_well_linked libPelmHostTesting.so.1
     ;;
 esac
 needs_only_libc

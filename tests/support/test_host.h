@@ -1,12 +1,12 @@
-// The eight host services as the test programs define them: they serve bytes that the test holds, fail where a test
-// asks for it, and keep account of every block, seek and read.
+// The host for tests (PelmHostTesting.h) as the test programs see it: what was asked of it as lists to compare, and a
+// source over guarded bytes.
 #pragma once
 
 #include <cstdint>
 #include <string>
 #include <vector>
 
-#include "PelmHost.h"
+#include "PelmHostTesting.h"
 #include "tests/support/guarded_buffer.h"
 
 namespace pelm::test {
@@ -24,7 +24,7 @@ struct ReadCall {
     bool operator==(const ReadCall &) const = default;
 };
 
-// What a host does wrong, or differently, from some moment on. Calls are counted from 1; 0 means never.
+// The faults that the tests ask for (PelmTestFaults has all). Calls are counted from 1; 0 means never.
 struct HostFaults {
     int failing_allocation = 0;
     int failing_allocations_from = 0;
@@ -58,20 +58,11 @@ public:
     // What the library did that it must not do: one line each.
     std::vector<std::string> violations;
 
-    void *allocate(uint32_t size);
-    void free(void *block);
-    int32_t read(InputSource *source, void *destination, int32_t count);
-    int32_t seek(InputSource *source, int32_t offset, int32_t origin);
-
 private:
-    struct Block {
-        uint8_t *payload;
-        uint32_t size;
-    };
-    void check_margins(const Block &block);
-    void give_back(const Block &block);
-
-    std::vector<Block> blocks_;
+    TestHost();
+    static void observe(void *host, const PelmTestCall *call);
+    void hand_over_faults() const;
+    void record(const PelmTestCall &call);
 };
 
 // A source of any kind over bytes of its own, which end flush against an inaccessible page. A stream's position lives
@@ -83,13 +74,13 @@ public:
     TestSource &operator=(const TestSource &) = delete;
 
     InputSource source{};
-    const uint8_t *bytes() const { return bytes_; }
+    const uint8_t *bytes() const { return served_.bytes; }
     // Whether the bytes are still those that it was made of.
     bool unchanged() const;
 
 private:
     GuardedBuffer memory_;
-    uint8_t *bytes_;
+    PelmTestBytes served_;
     std::vector<uint8_t> original_;
 };
 
