@@ -37,7 +37,7 @@ void undo_average_from(uint32_t i, uint8_t *__restrict row, const uint8_t *__res
         row[i] = static_cast<uint8_t>(row[i] + ((row[i - distance] + above[i]) >> 1));
 }
 
-inline uint8_t paeth(int32_t a, int32_t b, int32_t c) {
+[[maybe_unused]] inline uint8_t paeth(int32_t a, int32_t b, int32_t c) {
     const int32_t pa = std::abs(b - c);
     const int32_t pb = std::abs(a - c);
     const int32_t pc = std::abs(a + b - 2 * c);

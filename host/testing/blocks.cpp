@@ -58,7 +58,7 @@ bool fails(uint32_t size) {
 }
 
 uint8_t *new_block(uint32_t size) {
-    if (size > SIZE_MAX - 2 * margin_size || !make_room()) return nullptr;
+    if (uint64_t{size} + 2 * margin_size > SIZE_MAX || !make_room()) return nullptr;
     auto *const start = static_cast<uint8_t *>(malloc(size + 2 * margin_size));
     if (start == nullptr) return nullptr;
     uint8_t *const payload = start + margin_size;

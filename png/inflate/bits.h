@@ -90,7 +90,7 @@ inline uint32_t take_bytes(BitReader &reader, Input &input, uint8_t *to, uint32_
         to[taken++] = static_cast<uint8_t>(reader.bits);
     while (taken < count) {
         if (input.next == input.end && !more(input)) break;
-        const auto run = static_cast<uint32_t>(std::min<ptrdiff_t>(count - taken, input.end - input.next));
+        const auto run = static_cast<uint32_t>(std::min<int64_t>(count - taken, input.end - input.next));
         std::memcpy(to + taken, input.next, run);
         input.next += run;
         taken += run;

@@ -1,0 +1,124 @@
+// The lists of calls.
+#include "fuzz/calls.h"
+
+namespace pelm::fuzz {
+namespace {
+
+using Decode = int32_t (*)(ImageDecodeInfo *, void *, int32_t, int32_t);
+using DecodeRows = int32_t (*)(ImageDecodeInfo *, void *, int32_t, int32_t, int32_t);
+using End = int32_t (*)(ImageDecodeInfo *);
+
+template <Decode decode>
+int32_t in_box(ImageDecodeInfo *info, void *output, const Step &step) {
+    return decode(info, output, step.width, step.height);
+}
+
+template <DecodeRows decode>
+int32_t by_rows(ImageDecodeInfo *info, void *output, const Step &step) {
+    return decode(info, output, step.width, step.height, step.rows);
+}
+
+template <End end>
+int32_t ending(ImageDecodeInfo *info, void *, const Step &) {
+    return end(info);
+}
+
+int32_t ask_for_alpha(ImageDecodeInfo *info, void *, const Step &) {
+    return static_cast<int32_t>(PELMI_GetAlphaTrFlag(info));
+}
+
+constexpr uint32_t failed = 1u << PELM_RESULT_FAILED;
+constexpr uint32_t done = 1u << PELM_RESULT_DONE;
+constexpr uint32_t last_frame = 1u << PELM_RESULT_LAST_FRAME;
+constexpr uint32_t more = 1u << PELM_RESULT_MORE;
+
+constexpr Call bmp_calls[] = {
+    {"DecodeBMP", in_box<ZOTARPELMI_DecodeBMP>, Output::box, Progress::needs_idle, Leaks::refused_bmp, failed | done},
+    {"DestroyBMP", ending<PELMI_BMP_DestroyBMP>, Output::none, Progress::gives_up, Leaks::all_but_palette,
+     failed | done},
+};
+
+constexpr Call png_calls[] = {
+    {"DecodePNG", in_box<ZOTARPELMI_DecodePNG>, Output::box, Progress::steps, Leaks::nothing, failed | done},
+    {"DecodePNGIter", in_box<ZOTARPELMI_DecodePNGIter>, Output::box, Progress::steps, Leaks::nothing,
+     failed | done | more},
+    {"DecodePNGLine", by_rows<ZOTARPELMI_DecodePNGLine>, Output::box, Progress::steps, Leaks::nothing,
+     failed | done | more},
+    {"DestroyPNGInfo", ending<ZOTARPELMI_DestroyPNGInfo>, Output::none, Progress::gives_up, Leaks::nothing,
+     failed | done},
+    {"AbortPNGIter", ending<ZOTARPELMI_AbortPNGIter>, Output::none, Progress::gives_up, Leaks::nothing, failed | done},
+    {"GetAlphaTrFlag", ask_for_alpha, Output::none, Progress::whole, Leaks::read_buffer, failed | done},
+};
+
+constexpr Call gif_calls[] = {
+    {"DecodeGIF", in_box<ZOTARPELMI_DecodeGIF>, Output::box, Progress::whole, Leaks::broken_gif, failed | done},
+    {"DecodeGIFIter", in_box<ZOTARPELMI_DecodeGIFIter>, Output::kept, Progress::steps, Leaks::broken_gif,
+     failed | done | more},
+    {"DecodeGIFLine", by_rows<ZOTARPELMI_DecodeGIFLine>, Output::rows, Progress::steps, Leaks::nothing, failed | done},
+    {"DecodeAGIF", in_box<ZOTARPELMI_DecodeAGIF>, Output::kept, Progress::steps, Leaks::nothing,
+     failed | done | last_frame},
+    {"DecodeAGIFIter", in_box<ZOTARPELMI_DecodeAGIFIter>, Output::kept, Progress::steps, Leaks::nothing,
+     failed | done | more | last_frame},
+    {"AbortGIFIter", ending<ZOTARPELMI_AbortGIFIter>, Output::none, Progress::gives_up, Leaks::nothing, failed | done},
+    {"AborAGIF", ending<ZOTARPELMI_AborAGIF>, Output::none, Progress::gives_up, Leaks::nothing, failed | done},
+};
+
+size_t bytes_in_gif_formats(uint32_t output_format) {
+    switch (output_format) {
+    case PELM_FORMAT_RGB565:
+    case PELM_FORMAT_BGR565: return 2;
+    case PELM_FORMAT_RGB888:
+    case PELM_FORMAT_BGR888: return 3;
+    case PELM_FORMAT_ARGB8888:
+    case PELM_FORMAT_RGBA8888:
+    case PELM_FORMAT_BGRA8888:
+    case PELM_FORMAT_BGRX8888: return 4;
+    default: return 0;
+    }
+}
+
+size_t bytes_in_full_colour_formats(uint32_t output_format) {
+    switch (output_format) {
+    case PELM_FORMAT_RGB565: return 2;
+    case PELM_FORMAT_RGB888:
+    case PELM_FORMAT_RGB565_A8: return 3;
+    case PELM_FORMAT_ARGB8888:
+    case PELM_FORMAT_RGBA8888:
+    case PELM_FORMAT_BGRA8888: return 4;
+    default: return 0;
+    }
+}
+
+} // namespace
+
+std::span<const Call> calls_of(Format format) {
+    switch (format) {
+    case Format::bmp: return bmp_calls;
+    case Format::png: return png_calls;
+    default: return gif_calls;
+    }
+}
+
+std::span<const Call> decoding_calls(Format format) {
+    switch (format) {
+    case Format::bmp: return std::span(bmp_calls).first(1);
+    case Format::png: return std::span(png_calls).first(3);
+    case Format::gif: return std::span(gif_calls).first(3);
+    default: return std::span(gif_calls).subspan(3, 2);
+    }
+}
+
+void give_up(Format format, ImageDecodeInfo &info) {
+    switch (format) {
+    case Format::bmp: PELMI_BMP_DestroyBMP(&info); return;
+    case Format::png: ZOTARPELMI_DestroyPNGInfo(&info); return;
+    default: ZOTARPELMI_AborAGIF(&info); return;
+    }
+}
+
+size_t bytes_per_output_pixel(Format format, uint32_t output_format) {
+    const bool is_gif = format == Format::gif || format == Format::agif;
+    return is_gif ? bytes_in_gif_formats(output_format) : bytes_in_full_colour_formats(output_format);
+}
+
+} // namespace pelm::fuzz

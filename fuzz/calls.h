@@ -1,0 +1,60 @@
+// The public calls: what each takes, what it may answer, and what the caller has to provide.
+#pragma once
+
+#include <cstdint>
+#include <span>
+
+#include "fuzz/plan.h"
+
+namespace pelm::fuzz {
+
+// The buffer behind a call's output argument.
+enum class Output : uint8_t {
+    none,
+    box,  // of this call
+    kept, // the box of the decode's first call, until the decode ends; later arguments are not looked at
+    rows  // the rows of this call, as wide as the box of the decode's first call, in every placement
+};
+
+// What a call does with the decode that is in progress.
+enum class Progress : uint8_t {
+    whole,      // neither continues nor leaves one
+    needs_idle, // the same, but one in progress would be lost
+    steps,      // begins one or goes on with it
+    parks,      // begins one that only calls that `resume` may go on with
+    resumes,    // ends one that was parked
+    gives_up    // ends one
+};
+
+enum class Leaks : uint8_t {
+    nothing,
+    broken_gif,     // all of the decode, when the file breaks off before its first image
+    read_buffer,    // of 16384 bytes, except for kind 0
+    refused_bmp,    // record and palette, for the refusals that leak
+    unsigned_bmp,   // the record, when there is no BM
+    all,            // of the decode that is given up
+    all_but_palette // and but the record
+};
+
+struct Call {
+    const char *name;
+    int32_t (*make)(ImageDecodeInfo *info, void *output, const Step &step);
+    Output output;
+    Progress progress;
+    Leaks leaks;
+    uint32_t results; // bit n: n may be answered
+};
+
+// All calls that a request of the format may be handed to: stills and animations of GIF share theirs.
+std::span<const Call> calls_of(Format format);
+
+// Those of them that decode, for the format alone.
+std::span<const Call> decoding_calls(Format format);
+
+// Gives up and frees what is in progress, as far as the format's calls can.
+void give_up(Format format, ImageDecodeInfo &info);
+
+// Of the format's decoders; 0 for formats that they do not write.
+size_t bytes_per_output_pixel(Format format, uint32_t output_format);
+
+} // namespace pelm::fuzz

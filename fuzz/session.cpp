@@ -1,0 +1,233 @@
+#include "fuzz/session.h"
+
+#include <algorithm>
+#include <cstring>
+#include <memory>
+#include <optional>
+
+#include "fuzz/account.h"
+#include "fuzz/calls.h"
+#include "fuzz/exact_bytes.h"
+
+namespace pelm::fuzz {
+namespace {
+
+constexpr uint8_t background = 0x5C;
+constexpr uint32_t untouched = 0x5E5E5E5E;
+constexpr uint64_t largest_output = 1u << 20;
+
+struct Sides {
+    int32_t width, height;
+    bool operator==(const Sides &) const = default;
+};
+
+// What can be seen of a session.
+struct Outcome {
+    std::vector<int32_t> results;
+    std::vector<Sides> scaled; // after each call
+    uint64_t pixels = 0;       // hashed
+    bool operator==(const Outcome &) const = default;
+};
+
+uint64_t hash(uint64_t so_far, const uint8_t *bytes, size_t count) {
+    for (size_t i = 0; i < count; ++i)
+        so_far = (so_far ^ bytes[i]) * 0x100000001B3u;
+    return so_far;
+}
+
+size_t stated_size(const Plan &plan) {
+    const auto size = static_cast<int64_t>(plan.file.size()) + plan.size_lie;
+    return static_cast<size_t>(std::max<int64_t>(size, 0));
+}
+
+// Memory has the bytes that its size says, and no lie makes it more; a stream has its own.
+size_t held_bytes(const Plan &plan) {
+    return plan.kind == PELM_SOURCE_MEMORY ? std::min(plan.file.size(), stated_size(plan)) : plan.file.size();
+}
+
+class Session {
+public:
+    // `measured`: an earlier session's outcome with the sizes of exact buffers. Without buffers it measures them.
+    Session(const Plan &plan, int32_t filling, bool has_buffers, const Outcome *measured);
+    Outcome run();
+
+private:
+    void make(const Call &call, const Step &step);
+    void carry_out_step(const Step &step);
+    bool is_legal(const Call &call) const;
+    uint8_t *output_for(const Call &call, const Step &step);
+    uint8_t *buffer(std::unique_ptr<ExactBytes> &holder, int64_t width, int64_t height, bool anew);
+    uint8_t *box_buffer(std::unique_ptr<ExactBytes> &holder, const Step &step, bool anew);
+    void look_at(const Call &call, const Step &step, int32_t result);
+    void look_at_buffers();
+    void free_colour_tables();
+    void end();
+
+    const Plan &plan_;
+    const bool has_buffers_;
+    const Outcome *const measured_;
+    Outcome outcome_;
+    Account account_;
+    ExactBytes file_;
+    PelmTestBytes bytes_;
+    InputSource source_{};
+    ImageDecodeInfo info_{};
+    std::optional<ExactBytes> own_table_;
+
+    std::unique_ptr<ExactBytes> box_, kept_, rows_;
+    std::vector<std::unique_ptr<ExactBytes>> outlived_; // a decode might still write there, wrongly
+    Output begun_with_ = Output::none;                  // the decode in progress, and the width that it was told
+    int32_t begun_width_ = 0;
+};
+
+Session::Session(const Plan &plan, int32_t filling, bool has_buffers, const Outcome *measured)
+    : plan_(plan), has_buffers_(has_buffers), measured_(measured), account_(plan, filling),
+      file_(held_bytes(plan)), bytes_{file_.bytes(), static_cast<int32_t>(file_.size()), plan.stated_end ? 1 : 0} {
+    if (file_.size() > 0) memcpy(file_.bytes(), plan.file.data(), file_.size());
+    PelmTest_OpenSource(&source_, plan.kind, &bytes_, plan.buffer_size);
+    source_.size = static_cast<int32_t>(plan.kind == PELM_SOURCE_MEMORY ? file_.size() : stated_size(plan));
+    if (plan.no_data) source_.data = nullptr;
+    info_.input = plan.kind == no_source ? nullptr : &source_;
+    info_.outputFormat = plan.output_format;
+    info_.flags = plan.flags;
+    info_.imageHeight = plan.image_height;
+    info_.reserved3 = info_.reserved4 = info_.reserved11 = info_.reserved12 = info_.reserved13 = info_.reserved16 =
+        untouched;
+    if (plan.own_colour_table && plan.format == Format::gif) {
+        own_table_.emplace(768u);
+        info_.globalColorTable = own_table_->bytes();
+    }
+}
+
+Outcome Session::run() {
+    if (plan_.most_calls == 1) {
+        for (const Step &step : plan_.steps)
+            carry_out_step(step);
+    } else {
+        uint32_t calls = 0;
+        do {
+            const auto ways = decoding_calls(plan_.format);
+            make(ways[plan_.steps[0].call % ways.size()], plan_.steps[0]);
+        } while (info_.decoderState != nullptr && ++calls < plan_.most_calls);
+    }
+    end();
+    return outcome_;
+}
+
+void Session::carry_out_step(const Step &step) {
+    const auto calls = calls_of(plan_.format);
+    const Call &call = calls[step.call % calls.size()];
+    if (is_legal(call)) make(call, step);
+}
+
+// Only what the header allows: a decode must not be forgotten, and goes on with calls of its own kind.
+bool Session::is_legal(const Call &call) const {
+    const bool idle = info_.decoderState == nullptr;
+    switch (call.progress) {
+    case Progress::needs_idle: return idle;
+    default: return true;
+    }
+}
+
+void Session::make(const Call &call, const Step &step) {
+    const bool was_idle = info_.decoderState == nullptr;
+    if (was_idle) {
+        begun_with_ = call.output;
+        begun_width_ = step.width;
+    }
+    uint8_t *const output = output_for(call, step);
+    info_.hasTransparency = untouched;
+    account_.begin_call();
+    const int32_t result = call.make(step.null_request ? nullptr : &info_, output, step);
+    outcome_.results.push_back(result);
+    outcome_.scaled.push_back({info_.outputWidth, info_.outputHeight});
+    look_at(call, step, result);
+}
+
+uint8_t *Session::buffer(std::unique_ptr<ExactBytes> &holder, int64_t width, int64_t height, bool anew) {
+    const size_t pixel = bytes_per_output_pixel(plan_.format, plan_.output_format);
+    const bool is_empty = width <= 0 || height <= 0 || pixel == 0;
+    const uint64_t side = largest_output + 1;
+    const uint64_t pixels =
+        is_empty ? 0 : std::min(static_cast<uint64_t>(width), side) * std::min(static_cast<uint64_t>(height), side);
+    if (pixels * pixel > largest_output) return nullptr;
+    const auto size = static_cast<size_t>(pixels * pixel);
+    if (holder != nullptr && holder->size() == size && !anew) return holder->bytes();
+    if (holder != nullptr) outlived_.push_back(std::move(holder));
+    holder = std::make_unique<ExactBytes>(size, plan_.alignment);
+    memset(holder->bytes(), background, size);
+    return holder->bytes();
+}
+
+uint8_t *Session::box_buffer(std::unique_ptr<ExactBytes> &holder, const Step &step, bool anew) {
+    const bool exact = (plan_.flags & PELM_PLACE_MASK) == PELM_PLACE_EXACT;
+    if (!exact) return buffer(holder, step.width, step.height, anew);
+    const Sides scaled = measured_->scaled.at(outcome_.scaled.size());
+    return buffer(holder, scaled.width, scaled.height, anew);
+}
+
+uint8_t *Session::output_for(const Call &call, const Step &step) {
+    if (!has_buffers_ || step.null_output || step.null_request) return nullptr;
+    const bool idle = info_.decoderState == nullptr;
+    switch (call.output) {
+    case Output::none: return nullptr;
+    case Output::box: return box_buffer(box_, step, false);
+    case Output::kept: return idle ? box_buffer(kept_, step, true) : nullptr;
+    case Output::rows: return buffer(rows_, begun_width_, step.rows, false);
+    }
+    return nullptr;
+}
+
+void Session::look_at(const Call &call, const Step &step, int32_t result) {
+    const bool idle = info_.decoderState == nullptr;
+    check(call, result >= 0 && result < 32 && (call.results >> result & 1) != 0, "gave a result that it has not");
+    check(call, !step.null_request || result == 0, "did something without a request");
+    check(call,
+          info_.reserved3 == untouched && info_.reserved4 == untouched && info_.reserved11 == untouched &&
+              info_.reserved12 == untouched && info_.reserved13 == untouched && info_.reserved16 == untouched,
+          "changed a reserved word");
+    if (plan_.format == Format::png && !step.null_request && call.output == Output::box)
+        check(call, idle == (result != PELM_RESULT_MORE), "kept or lost its state");
+    if (idle) free_colour_tables();
+    account_.end_call(call, {result, idle, info_.hasTransparency != untouched});
+    look_at_buffers();
+}
+
+void Session::look_at_buffers() {
+    const ExactBytes *const buffers[] = {box_.get(), kept_.get(), rows_.get()};
+    for (const ExactBytes *const each : buffers) {
+        if (each == nullptr) continue;
+        if (!each->is_intact_before()) give_reason("a byte before the output was written");
+        if (plan_.other_filling) outcome_.pixels = hash(outcome_.pixels, each->bytes(), each->size());
+    }
+}
+
+// Animations leave the two tables to the caller.
+void Session::free_colour_tables() {
+    uint8_t *const own = own_table_ ? own_table_->bytes() : nullptr;
+    if (info_.globalColorTable != own && info_.globalColorTable != nullptr) ZOTARPELM_OsFree(info_.globalColorTable);
+    if (info_.localColorTable != nullptr) ZOTARPELM_OsFree(info_.localColorTable);
+    info_.globalColorTable = own;
+    info_.localColorTable = nullptr;
+}
+
+void Session::end() {
+    give_up(plan_.format, info_);
+    free_colour_tables();
+    account_.end();
+}
+
+} // namespace
+
+void carry_out(const Plan &plan) {
+    const bool exact = (plan.flags & PELM_PLACE_MASK) == PELM_PLACE_EXACT;
+    const int32_t filling = plan.faults.filling;
+    Outcome measured;
+    if (exact) measured = Session(plan, filling, false, nullptr).run();
+    const Outcome outcome = Session(plan, filling, true, &measured).run();
+    if (exact && outcome.results != measured.results) give_reason("other results without a buffer");
+    if (plan.other_filling && outcome != Session(plan, filling ^ 0xFF, true, &measured).run())
+        give_reason("what the host's memory held has been seen in the output");
+}
+
+} // namespace pelm::fuzz
