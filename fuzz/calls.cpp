@@ -38,6 +38,10 @@ constexpr Call bmp_calls[] = {
      failed | done},
 };
 
+constexpr Call wbmp_calls[] = {
+    {"DecodeWBMP", in_box<ZOTARPELMI_DecodeWBMP>, Output::box, Progress::whole, Leaks::nothing, failed | done},
+};
+
 constexpr Call png_calls[] = {
     {"DecodePNG", in_box<ZOTARPELMI_DecodePNG>, Output::box, Progress::steps, Leaks::nothing, failed | done},
     {"DecodePNGIter", in_box<ZOTARPELMI_DecodePNGIter>, Output::box, Progress::steps, Leaks::nothing,
@@ -77,6 +81,16 @@ size_t bytes_in_gif_formats(uint32_t output_format) {
     }
 }
 
+size_t bytes_in_wbmp_formats(uint32_t output_format) {
+    switch (output_format) {
+    case PELM_FORMAT_RGB565: return 2;
+    case PELM_FORMAT_RGB888: return 3;
+    case PELM_FORMAT_RGBA8888:
+    case PELM_FORMAT_BGRA8888: return 4;
+    default: return 0;
+    }
+}
+
 size_t bytes_in_full_colour_formats(uint32_t output_format) {
     switch (output_format) {
     case PELM_FORMAT_RGB565: return 2;
@@ -94,6 +108,7 @@ size_t bytes_in_full_colour_formats(uint32_t output_format) {
 std::span<const Call> calls_of(Format format) {
     switch (format) {
     case Format::bmp: return bmp_calls;
+    case Format::wbmp: return wbmp_calls;
     case Format::png: return png_calls;
     default: return gif_calls;
     }
@@ -102,6 +117,7 @@ std::span<const Call> calls_of(Format format) {
 std::span<const Call> decoding_calls(Format format) {
     switch (format) {
     case Format::bmp: return std::span(bmp_calls).first(1);
+    case Format::wbmp: return wbmp_calls;
     case Format::png: return std::span(png_calls).first(3);
     case Format::gif: return std::span(gif_calls).first(3);
     default: return std::span(gif_calls).subspan(3, 2);
@@ -111,14 +127,23 @@ std::span<const Call> decoding_calls(Format format) {
 void give_up(Format format, ImageDecodeInfo &info) {
     switch (format) {
     case Format::bmp: PELMI_BMP_DestroyBMP(&info); return;
+    case Format::wbmp: return;
     case Format::png: ZOTARPELMI_DestroyPNGInfo(&info); return;
     default: ZOTARPELMI_AborAGIF(&info); return;
     }
 }
 
 size_t bytes_per_output_pixel(Format format, uint32_t output_format) {
-    const bool is_gif = format == Format::gif || format == Format::agif;
-    return is_gif ? bytes_in_gif_formats(output_format) : bytes_in_full_colour_formats(output_format);
+    switch (format) {
+    case Format::bmp:
+    case Format::png: return bytes_in_full_colour_formats(output_format);
+    case Format::wbmp: return bytes_in_wbmp_formats(output_format);
+    default: return bytes_in_gif_formats(output_format);
+    }
+}
+
+bool knows_exact_buffers(Format format) {
+    return format != Format::wbmp;
 }
 
 } // namespace pelm::fuzz

@@ -57,4 +57,7 @@ void give_up(Format format, ImageDecodeInfo &info);
 // Of the format's decoders; 0 for formats that they do not write.
 size_t bytes_per_output_pixel(Format format, uint32_t output_format);
 
+// Whether PELM_PLACE_EXACT means anything to its decoders.
+bool knows_exact_buffers(Format format);
+
 } // namespace pelm::fuzz

@@ -71,6 +71,27 @@ void write_bmps() {
     write("callseq", "bmp", next_head(9, 7), some_calls(Format::bmp, 8), file_bytes(core));
 }
 
+Bytes wbmp_of(uint8_t width, uint8_t height) {
+    Bytes file = {0, 0, width, height};
+    for (int i = 0; i < (width + 7) / 8 * height; ++i)
+        file.push_back(static_cast<uint8_t>(i * 73 + 90));
+    return file;
+}
+
+void write_wbmps() {
+    for (uint8_t i = 0; i < 8; ++i) {
+        Head head = next_head(23, 17);
+        head.kind %= 2;
+        head.format = i % 4 == 2 ? 4 : i % 4 == 3 ? 5 : i % 4;
+        head.flags = i % 3 == 2 ? 2 << 2 : 0;
+        write("wbmp", "picture_" + std::to_string(i), head, {}, wbmp_of(23, 17));
+    }
+    Bytes longer = wbmp_of(23, 17);
+    longer.insert(longer.begin() + 2, {0x80, 0x80, 0x80});
+    write("wbmp", "four_groups", next_head(23, 17), {}, longer);
+    write("callseq", "wbmp", next_head(23, 17), some_calls(Format::wbmp, 3), wbmp_of(23, 17));
+}
+
 pelm::test::Png png_of(uint8_t colour_type, uint8_t depth, uint8_t interlace) {
     pelm::test::Png png{.width = 11, .height = 9, .colour_type = colour_type, .depth = depth, .interlace = interlace};
     png.rows = pelm::test::smooth_rows(png);
@@ -207,6 +228,7 @@ int main(int count, char **names) {
     }
     folder = names[1];
     write_bmps();
+    write_wbmps();
     write_pngs();
     write_gifs();
     printf("%u seeds\n", written);

@@ -45,6 +45,10 @@ size_t held_bytes(const Plan &plan) {
     return plan.kind == PELM_SOURCE_MEMORY ? std::min(plan.file.size(), stated_size(plan)) : plan.file.size();
 }
 
+bool has_exact_buffers(const Plan &plan) {
+    return knows_exact_buffers(plan.format) && (plan.flags & PELM_PLACE_MASK) == PELM_PLACE_EXACT;
+}
+
 class Session {
 public:
     // `measured`: an earlier session's outcome with the sizes of exact buffers. Without buffers it measures them.
@@ -160,8 +164,7 @@ uint8_t *Session::buffer(std::unique_ptr<ExactBytes> &holder, int64_t width, int
 }
 
 uint8_t *Session::box_buffer(std::unique_ptr<ExactBytes> &holder, const Step &step, bool anew) {
-    const bool exact = (plan_.flags & PELM_PLACE_MASK) == PELM_PLACE_EXACT;
-    if (!exact) return buffer(holder, step.width, step.height, anew);
+    if (!has_exact_buffers(plan_)) return buffer(holder, step.width, step.height, anew);
     const Sides scaled = measured_->scaled.at(outcome_.scaled.size());
     return buffer(holder, scaled.width, scaled.height, anew);
 }
@@ -188,6 +191,8 @@ void Session::look_at(const Call &call, const Step &step, int32_t result) {
           "changed a reserved word");
     if (plan_.format == Format::png && !step.null_request && call.output == Output::box)
         check(call, idle == (result != PELM_RESULT_MORE), "kept or lost its state");
+    if (plan_.format == Format::wbmp && plan_.kind == PELM_SOURCE_STREAM)
+        check(call, source_.data == nullptr, "left its row buffer in the source");
     if (idle) free_colour_tables();
     account_.end_call(call, {result, idle, info_.hasTransparency != untouched});
     look_at_buffers();
@@ -220,7 +225,7 @@ void Session::end() {
 } // namespace
 
 void carry_out(const Plan &plan) {
-    const bool exact = (plan.flags & PELM_PLACE_MASK) == PELM_PLACE_EXACT;
+    const bool exact = has_exact_buffers(plan);
     const int32_t filling = plan.faults.filling;
     Outcome measured;
     if (exact) measured = Session(plan, filling, false, nullptr).run();
