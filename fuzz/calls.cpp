@@ -31,11 +31,24 @@ constexpr uint32_t failed = 1u << PELM_RESULT_FAILED;
 constexpr uint32_t done = 1u << PELM_RESULT_DONE;
 constexpr uint32_t last_frame = 1u << PELM_RESULT_LAST_FRAME;
 constexpr uint32_t more = 1u << PELM_RESULT_MORE;
+constexpr uint32_t data_ended = 1u << PELM_RESULT_DATA_ENDED;
+
+int32_t pre_init(ImageDecodeInfo *info, void *, const Step &step) {
+    return ZOTARPELMI_PreInitBMP(info, step.rows);
+}
 
 constexpr Call bmp_calls[] = {
     {"DecodeBMP", in_box<ZOTARPELMI_DecodeBMP>, Output::box, Progress::needs_idle, Leaks::refused_bmp, failed | done},
-    {"DestroyBMP", ending<PELMI_BMP_DestroyBMP>, Output::none, Progress::gives_up, Leaks::all_but_palette,
+    {"DecodeBMPIter", in_box<ZOTARPELMI_DecodeBMPIter>, Output::kept, Progress::steps, Leaks::refused_bmp,
+     failed | done | more},
+    {"DecodeBMPIterLine", by_rows<ZOTARPELMI_DecodeBMPIterLine>, Output::kept, Progress::steps, Leaks::refused_bmp,
      failed | done},
+    {"DecodeBMPLine", by_rows<ZOTARPELMI_DecodeBMPLine>, Output::own_rows, Progress::steps, Leaks::refused_bmp,
+     failed | done | data_ended},
+    {"PreInitBMP", pre_init, Output::none, Progress::parks, Leaks::unsigned_bmp, failed | done},
+    {"DecodeBMPSKIA", in_box<ZOTARPELMI_DecodeBMPSKIA>, Output::box, Progress::resumes, Leaks::nothing, failed | done},
+    {"AbortBMPIter", ending<ZOTARPELMI_AbortBMPIter>, Output::none, Progress::gives_up, Leaks::all, failed | done},
+    {"DestroyBMP", ending<PELMI_BMP_DestroyBMP>, Output::none, Progress::gives_up_any, Leaks::all, failed | done},
 };
 
 constexpr Call wbmp_calls[] = {
@@ -116,12 +129,16 @@ std::span<const Call> calls_of(Format format) {
 
 std::span<const Call> decoding_calls(Format format) {
     switch (format) {
-    case Format::bmp: return std::span(bmp_calls).first(1);
+    case Format::bmp: return std::span(bmp_calls).first(5);
     case Format::wbmp: return wbmp_calls;
     case Format::png: return std::span(png_calls).first(3);
     case Format::gif: return std::span(gif_calls).first(3);
     default: return std::span(gif_calls).subspan(3, 2);
     }
+}
+
+const Call &resuming_call() {
+    return bmp_calls[5];
 }
 
 void give_up(Format format, ImageDecodeInfo &info) {

@@ -11,29 +11,30 @@ namespace pelm::fuzz {
 // The buffer behind a call's output argument.
 enum class Output : uint8_t {
     none,
-    box,  // of this call
-    kept, // the box of the decode's first call, until the decode ends; later arguments are not looked at
-    rows  // the rows of this call, as wide as the box of the decode's first call, in every placement
+    box,     // of this call
+    kept,    // the box of the decode's first call, until the decode ends; later arguments are not looked at
+    rows,    // of this call, as wide as the box of the decode's first call, in every placement
+    own_rows // the same, as wide as the box of this call
 };
 
 // What a call does with the decode that is in progress.
 enum class Progress : uint8_t {
-    whole,      // neither continues nor leaves one
-    needs_idle, // the same, but one in progress would be lost
-    steps,      // begins one or goes on with it
-    parks,      // begins one that only calls that `resume` may go on with
-    resumes,    // ends one that was parked
-    gives_up    // ends one
+    whole,       // neither continues nor leaves one
+    needs_idle,  // the same, but one in progress would be lost
+    steps,       // begins one or goes on with it
+    parks,       // begins one that only calls that `resume` may go on with
+    resumes,     // ends one that was parked
+    gives_up,    // ends one
+    gives_up_any // ends one, also when it was parked
 };
 
 enum class Leaks : uint8_t {
     nothing,
-    broken_gif,     // all of the decode, when the file breaks off before its first image
-    read_buffer,    // of 16384 bytes, except for kind 0
-    refused_bmp,    // record and palette, for the refusals that leak
-    unsigned_bmp,   // the record, when there is no BM
-    all,            // of the decode that is given up
-    all_but_palette // and but the record
+    broken_gif,   // all of the decode, when the file breaks off before its first image
+    read_buffer,  // of 16384 bytes, except for kind 0
+    refused_bmp,  // record and palette, for the refusals that leak
+    unsigned_bmp, // the record, when there is no BM
+    all           // of the decode that is given up, or all but its record and palette
 };
 
 struct Call {
@@ -50,6 +51,9 @@ std::span<const Call> calls_of(Format format);
 
 // Those of them that decode, for the format alone.
 std::span<const Call> decoding_calls(Format format);
+
+// The one that goes on with what was parked.
+const Call &resuming_call();
 
 // Gives up and frees what is in progress, as far as the format's calls can.
 void give_up(Format format, ImageDecodeInfo &info);

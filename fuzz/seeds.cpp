@@ -7,8 +7,10 @@
 #include <string>
 
 #include "fuzz/plan.h"
+#include "tests/gif/support/gif_builder.h"
 #include "tests/png/support/png_builder.h"
 #include "tests/support/bmp_builder.h"
+#include "tests/support/run_length_codes.h"
 
 using namespace pelm::fuzz;
 using pelm::test::Bytes;
@@ -64,6 +66,17 @@ void write_bmps() {
             const std::string name = std::string(variant.name) + (top_down ? "_top_down" : "");
             write("bmp", name, next_head(9, 7), {}, file);
         }
+    }
+    for (const int bits : {8, 4}) {
+        pelm::test::Noise noise(1);
+        const auto picture = pelm::test::noise_picture(9, 7, static_cast<uint16_t>(bits), 1);
+        const Bytes codes = run_length_codes(picture, bits, noise, {true, true, true, true, true});
+        const Bytes palette = pelm::test::noise_palette(1u << bits, 1);
+        Head head = next_head(9, 7);
+        head.call = 4;
+        head.rows = 1;
+        write("bmp", "run_lengths_" + std::to_string(bits), head, {},
+              file_bytes(pelm::test::run_length_bmp(bits, 9, 7, codes, palette)));
     }
     pelm::test::BmpFile core = pelm::test::noise_bmp(pelm::test::variant_named("twenty_four_bits"), 5, 4, false);
     core.header_size = 12;
@@ -123,100 +136,64 @@ void write_pngs() {
     write("callseq", "png_interlaced", next_head(11, 9), some_calls(Format::png, 6), build(png_of(2, 8, 1)));
 }
 
-void append_word(Bytes &bytes, uint32_t value) {
-    bytes.push_back(static_cast<uint8_t>(value));
-    bytes.push_back(static_cast<uint8_t>(value >> 8));
+using pelm::test::GifFile;
+using pelm::test::GraphicControl;
+using pelm::test::ImagePlace;
+
+constexpr uint16_t screen_width = 13;
+constexpr uint16_t screen_height = 20;
+
+void add_frame(GifFile &gif, const GraphicControl &control, const ImagePlace &place, uint32_t seed, bool own_table) {
+    const size_t count = size_t{place.width} * place.height;
+    gif.control(control);
+    gif.image(place, pelm::test::noise_pixels(count, 16, seed), 4,
+              own_table ? pelm::test::distinct_table(256, seed) : pelm::test::ColourTable{});
 }
 
-struct Frame {
-    uint32_t left, top, width, height;
-    bool interlaced;
-    uint8_t disposal;
-    int transparent; // -1: none
-    bool own_table;
+struct GifSeed {
+    const char *name;
+    GifFile gif;
 };
 
-void append_table(Bytes &bytes, uint8_t entries) {
-    for (uint8_t i = 0; i < entries; ++i)
-        bytes.insert(bytes.end(), {static_cast<uint8_t>(i * 60), static_cast<uint8_t>(255 - i * 50), i});
-}
-
-// Codes of 3 bits, with a clear code before every third pixel, so that they never grow.
-void append_pixels(Bytes &bytes, uint32_t count) {
-    Bytes data;
-    uint32_t bits = 0;
-    uint32_t held = 0;
-    const auto put = [&](uint32_t code) {
-        bits |= code << held;
-        for (held += 3; held >= 8; held -= 8, bits >>= 8)
-            data.push_back(static_cast<uint8_t>(bits));
-    };
-    for (uint32_t i = 0; i < count; ++i) {
-        if (i % 3 == 0) put(4);
-        put(i * 7 / 5 % 4);
+std::vector<GifSeed> gif_seeds() {
+    const ImagePlace whole{0, 0, screen_width, screen_height};
+    const ImagePlace interlaced{0, 0, screen_width, screen_height, true};
+    const ImagePlace small{3, 4, 5, 3, true};
+    const ImagePlace wide{2, 15, 19, 9};
+    const struct {
+        const char *name;
+        std::vector<ImagePlace> places;
+    } files[] = {{"whole", {whole}}, {"interlaced", {interlaced}},
+                 {"small", {small}}, {"wide", {wide}},
+                 {"empty", {}},      {"frames", {whole, small, wide, interlaced, small}}};
+    std::vector<GifSeed> seeds;
+    for (const auto &file : files) {
+        GifFile gif;
+        gif.screen(screen_width, screen_height, pelm::test::distinct_table(16), 1);
+        gif.extension(0xFF, {{'N', 'E', 'T', 'S', 'C', 'A', 'P', 'E', '2', '.', '0'}, {1, 0, 0}});
+        uint8_t frame = 0;
+        for (const ImagePlace &place : file.places) {
+            add_frame(gif, {.disposal = frame, .transparent = frame % 2 == 0 ? 3 : -1, .delay = 7}, place, frame + 1u,
+                      frame % 2 == 1 || file.places.size() == 1);
+            ++frame;
+        }
+        gif.extension(0xFE, {{'.'}}).trailer();
+        seeds.push_back({file.name, gif});
     }
-    put(5);
-    if (held > 0) data.push_back(static_cast<uint8_t>(bits));
-    bytes.push_back(2);
-    for (size_t at = 0; at < data.size(); at += 50) {
-        const size_t size = std::min<size_t>(50, data.size() - at);
-        bytes.push_back(static_cast<uint8_t>(size));
-        const auto from = data.begin() + static_cast<ptrdiff_t>(at);
-        bytes.insert(bytes.end(), from, from + static_cast<ptrdiff_t>(size));
-    }
-    bytes.push_back(0);
-}
-
-Bytes gif_of(uint32_t width, uint32_t height, const std::vector<Frame> &frames) {
-    Bytes file = {'G', 'I', 'F', '8', '9', 'a'};
-    append_word(file, width);
-    append_word(file, height);
-    file.insert(file.end(), {0x81, 1, 0});
-    append_table(file, 4);
-    const std::string loops = "NETSCAPE2.0";
-    file.insert(file.end(), {0x21, 0xFF, 11});
-    file.insert(file.end(), loops.begin(), loops.end());
-    file.insert(file.end(), {3, 1, 0, 0, 0});
-    for (const Frame &frame : frames) {
-        const uint8_t transparency = frame.transparent >= 0 ? 1 : 0;
-        file.insert(file.end(), {0x21, 0xF9, 4, static_cast<uint8_t>(frame.disposal << 2 | transparency), 10, 0,
-                                 static_cast<uint8_t>(frame.transparent), 0, 0x2C});
-        for (const uint32_t word : {frame.left, frame.top, frame.width, frame.height})
-            append_word(file, word);
-        file.push_back(static_cast<uint8_t>((frame.interlaced ? 0x40 : 0) | (frame.own_table ? 0x81 : 0)));
-        if (frame.own_table) append_table(file, 4);
-        append_pixels(file, frame.width * frame.height);
-    }
-    file.push_back(0x3B);
-    return file;
+    return seeds;
 }
 
 void write_gifs() {
-    const Frame whole = {0, 0, 13, 20, false, 0, -1, false};
-    Frame interlaced = whole;
-    interlaced.interlaced = true;
-    Frame small = {3, 4, 5, 3, true, 1, 2, true};
-    Frame wide = {2, 15, 19, 9, false, 2, -1, false};
-    const struct {
-        const char *name;
-        std::vector<Frame> frames;
-    } files[] = {{"whole", {whole}},
-                 {"interlaced", {interlaced}},
-                 {"small", {small}},
-                 {"wide", {wide}},
-                 {"empty", {}},
-                 {"frames", {whole, small, wide, interlaced}},
-                 {"disposals", {small, {1, 1, 6, 6, false, 3, 0, false}, {0, 0, 4, 4, false, 2, 1, true}, wide}}};
+    const std::vector<GifSeed> seeds = gif_seeds();
     for (const char *const target : {"gif", "agif"}) {
-        for (const auto &file : files) {
-            for (int i = 0; i < 3; ++i) {
-                const std::string name = std::string(file.name) + "_" + std::to_string(i);
-                write(target, name, next_head(13, 20), {}, gif_of(13, 20, file.frames));
-            }
-        }
+        for (const GifSeed &seed : seeds)
+            for (int i = 0; i < 3; ++i)
+                write(target, std::string(seed.name).append("_").append(std::to_string(i)),
+                      next_head(screen_width, screen_height), {}, seed.gif.bytes);
     }
-    write("callseq", "gif", next_head(13, 20), some_calls(Format::gif, 7), gif_of(13, 20, files[5].frames));
-    write("callseq", "agif", next_head(13, 20), some_calls(Format::agif, 7), gif_of(13, 20, files[6].frames));
+    const Bytes &frames = seeds.back().gif.bytes;
+    write("callseq", "gif", next_head(screen_width, screen_height), some_calls(Format::gif, 7), frames);
+    write("callseq", "agif", next_head(screen_width, screen_height), some_calls(Format::agif, 7), frames);
 }
 
 } // namespace

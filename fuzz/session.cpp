@@ -45,6 +45,10 @@ size_t held_bytes(const Plan &plan) {
     return plan.kind == PELM_SOURCE_MEMORY ? std::min(plan.file.size(), stated_size(plan)) : plan.file.size();
 }
 
+bool is_staged(uint32_t kind) {
+    return kind == PELM_SOURCE_STREAM || kind == PELM_SOURCE_STREAM_ALT;
+}
+
 bool has_exact_buffers(const Plan &plan) {
     return knows_exact_buffers(plan.format) && (plan.flags & PELM_PLACE_MASK) == PELM_PLACE_EXACT;
 }
@@ -64,6 +68,8 @@ private:
     uint8_t *box_buffer(std::unique_ptr<ExactBytes> &holder, const Step &step, bool anew);
     void look_at(const Call &call, const Step &step, int32_t result);
     void look_at_buffers();
+    void bring_staging_buffer();
+    void follow_two_steps(const Call &call, const Step &step, int32_t result);
     void free_colour_tables();
     void end();
 
@@ -80,8 +86,8 @@ private:
 
     std::unique_ptr<ExactBytes> box_, kept_, rows_;
     std::vector<std::unique_ptr<ExactBytes>> outlived_; // a decode might still write there, wrongly
-    Output begun_with_ = Output::none;                  // the decode in progress, and the width that it was told
     int32_t begun_width_ = 0;
+    bool is_parked_ = false;
 };
 
 Session::Session(const Plan &plan, int32_t filling, bool has_buffers, const Outcome *measured)
@@ -108,11 +114,12 @@ Outcome Session::run() {
         for (const Step &step : plan_.steps)
             carry_out_step(step);
     } else {
-        uint32_t calls = 0;
-        do {
-            const auto ways = decoding_calls(plan_.format);
-            make(ways[plan_.steps[0].call % ways.size()], plan_.steps[0]);
-        } while (info_.decoderState != nullptr && ++calls < plan_.most_calls);
+        const auto ways = decoding_calls(plan_.format);
+        const Call &begins = ways[plan_.steps[0].call % ways.size()];
+        const Call &goes_on = begins.progress == Progress::parks ? resuming_call() : begins;
+        make(begins, plan_.steps[0]);
+        for (uint32_t calls = 1; info_.decoderState != nullptr && calls < plan_.most_calls; ++calls)
+            make(goes_on, plan_.steps[0]);
     }
     end();
     return outcome_;
@@ -124,28 +131,51 @@ void Session::carry_out_step(const Step &step) {
     if (is_legal(call)) make(call, step);
 }
 
-// Only what the header allows: a decode must not be forgotten, and goes on with calls of its own kind.
+// Only what the header allows: a decode must not be forgotten, and one that is parked is for two calls only.
 bool Session::is_legal(const Call &call) const {
     const bool idle = info_.decoderState == nullptr;
     switch (call.progress) {
-    case Progress::needs_idle: return idle;
-    default: return true;
+    case Progress::needs_idle:
+    case Progress::parks: return idle;
+    case Progress::resumes: return idle || is_parked_;
+    case Progress::gives_up_any: return true;
+    default: return !is_parked_;
     }
 }
 
 void Session::make(const Call &call, const Step &step) {
     const bool was_idle = info_.decoderState == nullptr;
     if (was_idle) {
-        begun_with_ = call.output;
         begun_width_ = step.width;
     }
     uint8_t *const output = output_for(call, step);
     info_.hasTransparency = untouched;
+    if (call.progress == Progress::resumes && is_parked_ && !step.null_request) bring_staging_buffer();
     account_.begin_call();
     const int32_t result = call.make(step.null_request ? nullptr : &info_, output, step);
     outcome_.results.push_back(result);
     outcome_.scaled.push_back({info_.outputWidth, info_.outputHeight});
+    follow_two_steps(call, step, result);
     look_at(call, step, result);
+}
+
+void Session::bring_staging_buffer() {
+    if (!is_staged(source_.kind) || source_.bufferSize <= 0) return;
+    source_.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(source_.bufferSize)));
+}
+
+// The record is gone after the second step whatever its result, and the staging buffer with it.
+void Session::follow_two_steps(const Call &call, const Step &step, int32_t result) {
+    if (step.null_request) return;
+    if (call.progress == Progress::resumes && is_parked_) {
+        check(call, result == PELM_RESULT_FAILED || info_.decoderState == nullptr, "kept its state");
+        check(call, !is_staged(source_.kind) || source_.data == nullptr, "left the staging buffer in the source");
+        info_.decoderState = nullptr;
+    }
+    if (call.progress == Progress::parks && result == PELM_RESULT_DONE) is_parked_ = true;
+    if (info_.decoderState == nullptr) is_parked_ = false;
+    // What is given up leaves its staging buffer behind, which must not be taken for the next one's.
+    if (call.leaks == Leaks::all && is_staged(source_.kind)) source_.data = nullptr;
 }
 
 uint8_t *Session::buffer(std::unique_ptr<ExactBytes> &holder, int64_t width, int64_t height, bool anew) {
@@ -177,6 +207,7 @@ uint8_t *Session::output_for(const Call &call, const Step &step) {
     case Output::box: return box_buffer(box_, step, false);
     case Output::kept: return idle ? box_buffer(kept_, step, true) : nullptr;
     case Output::rows: return buffer(rows_, begun_width_, step.rows, false);
+    case Output::own_rows: return buffer(rows_, step.width, step.rows, false);
     }
     return nullptr;
 }

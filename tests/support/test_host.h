@@ -58,6 +58,10 @@ public:
     // What the library did that it must not do: one line each.
     std::vector<std::string> violations;
 
+    // What a test allocates on behalf of the library, by the same account.
+    void *allocate(uint32_t size) { return ZOTARPELM_OsMalloc(size); }
+    void free(void *block) { ZOTARPELM_OsFree(block); }
+
 private:
     TestHost();
     static void observe(void *host, const PelmTestCall *call);
