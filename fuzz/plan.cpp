@@ -14,7 +14,7 @@ constexpr uint32_t kinds[] = {1, 0, 4, 2, 1, 0, 3, no_source};
 constexpr int32_t buffer_sizes[] = {4096, 1, 64, 333, 65536, 0, -1, 0x7FFFFFFF};
 constexpr int32_t absurd_sides[] = {0,      -1,        0x7FFFFFFF, -0x7FFFFFFF - 1, 65535,     65536,
                                     0x8000, 0x1000000, 46341,      0x40000000,      0x3FFFFFFF};
-constexpr int32_t rows_of_lines[] = {0, -1, 0x7FFFFFFF, -0x7FFFFFFF - 1, 1000, 0x10000};
+constexpr int32_t rows_of_lines[] = {0, -1, 0x7FFFFFFF, -0x7FFFFFFF - 1, 300, 0x10000};
 constexpr size_t step_bytes = 4;
 constexpr size_t most_steps = 24;
 constexpr uint32_t most_calls_of_a_decode = 100;
