@@ -11,8 +11,3 @@ if(PELM_SANITIZE)
   add_compile_options(-fsanitize=${PELM_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
   add_link_options(-fsanitize=${PELM_SANITIZE})
 endif()
-
-# What libFuzzer goes by, in everything that it is to reach.
-if(PELM_BUILD_FUZZERS)
-  add_compile_options(-fsanitize=fuzzer-no-link)
-endif()
