@@ -41,7 +41,7 @@ int32_t copy_rows(const BmpState &state, Band band, Reader &reader, OutputRows t
     for (int32_t i = 0; i < band.count; ++i) {
         load.row = read_row(reader, first + i);
         if (load.row == nullptr) return reader.result;
-        write_row_clipped(state.output, to.position, to.pixel_step, state.outputFormat, load, 0, state.width);
+        write_row_clipped(state.output.buffer, to.position, to.pixel_step, state.outputFormat, load, 0, state.width);
         advance(to);
     }
     return PELM_RESULT_DONE;
@@ -78,7 +78,7 @@ int32_t reduce_rows(const BmpState &state, Band band, Reader &reader, OutputRows
             if (load.row == nullptr) return reader.result;
             add_sample_line(load, sums, state.width, state.scaledWidth);
         }
-        write_row_clipped(state.output, to.position, to.pixel_step, state.outputFormat,
+        write_row_clipped(state.output.buffer, to.position, to.pixel_step, state.outputFormat,
                           SumsRow<typename Load::Sum>{sums}, 0, state.scaledWidth);
         ZOTARPELM_OsMemset(sums, 0, sums_bytes);
         advance(to);
@@ -103,7 +103,7 @@ int32_t decode_rows_from(const BmpState &state, intptr_t cursor, int32_t rows, c
     int32_t result = PELM_RESULT_FAILED;
     if (open_rows(reader, state, first_file_row(state, band))) {
         const OutputRows to = output_rows(state, cursor, band.count);
-        if (state.output.size == 0)
+        if (state.output.buffer.size == 0)
             result = pass_over_rows(state, band, reader);
         else if (state.oneToOne != 0)
             result = copy_rows(state, band, reader, to, load);

@@ -46,10 +46,12 @@ SetUp set_geometry(BmpState &state, ImageDecodeInfo &info, const Target &target)
     const Size buffer = mode == PELM_PLACE_EXACT ? scaled : box;
     state.outputFormat = info.outputFormat;
     size_t bytes = 0;
-    if (!buffer_bytes(buffer.width, buffer.height, bytes_per_pixel(state.outputFormat), bytes)) return SetUp::refused;
-    if (bytes == 0 || state.scaledWidth <= 0 || state.scaledHeight <= 0) return SetUp::done; // nothing will be written
-    state.output = {static_cast<uint8_t *>(target.output), target.output == nullptr ? 0 : bytes};
-    return place_in_output(state, buffer, scaled) ? SetUp::done : SetUp::refused;
+    const bool fits = buffer_bytes(buffer.width, buffer.height, bytes_per_pixel(state.outputFormat), bytes);
+    if (fits && (bytes == 0 || scaled.width <= 0 || scaled.height <= 0)) return SetUp::done; // nothing will be written
+    if (!fits || !place_in_output(state, buffer, scaled))
+        return target.output == nullptr ? SetUp::done : SetUp::refused; // a buffer that is not there need not fit
+    state.output.buffer = {static_cast<uint8_t *>(target.output), target.output == nullptr ? 0 : bytes};
+    return SetUp::done;
 }
 
 // Required: by the rows of this call, whatever the last one's were (docs/oddities.md, "Bands of changing height").
@@ -57,7 +59,7 @@ void advance_cursor(BmpState &state, int32_t rows) {
     const int64_t row_step = state.topDown != 0 ? -int64_t{state.rowStep} : state.rowStep;
     const int64_t cursor = state.outputCursor + row_step * rows;
     if (std::abs(cursor) > farthest_position)
-        state.output.size = 0;
+        state.output.buffer.size = 0;
     else
         state.outputCursor = static_cast<intptr_t>(cursor);
 }

@@ -15,6 +15,7 @@ bool allocate_staging(BmpState &state, InputSource &input) {
     if (!is_seekable_stream(input)) return true;
     const int32_t stride = row_stride(state.width, state.bitsPerPixel);
     input.bufferSize = input.bufferSize < stride ? stride : input.bufferSize / stride * stride;
+    state.output.stagingBytes = input.bufferSize;
     input.data = allocate_array<uint8_t>(static_cast<uint32_t>(input.bufferSize));
     return input.data != nullptr;
 }

@@ -24,12 +24,12 @@ void place_band(BmpState &band, void *output, int32_t row_pixels, int32_t rows) 
     const int32_t pixel_bytes = bytes_per_pixel(band.outputFormat);
     const int64_t row_step = int64_t{row_pixels} * pixel_bytes * (band.topDown != 0 ? -1 : 1);
     size_t bytes = 0;
-    band.output = {};
+    band.output.buffer = {};
     if (output == nullptr || row_pixels < band.scaledWidth || !fits_int32(row_step)) return;
     if (!buffer_bytes(row_pixels, rows, pixel_bytes, bytes)) return;
 
     const int64_t margin = (int64_t{row_pixels} - band.scaledWidth) >> 1;
-    band.output = {static_cast<uint8_t *>(output), bytes};
+    band.output.buffer = {static_cast<uint8_t *>(output), bytes};
     band.outputCursor = static_cast<intptr_t>(margin * pixel_bytes);
     band.rowStep = static_cast<int32_t>(row_step);
     band.pixelStep = pixel_bytes / pixel_step_unit(band.outputFormat);

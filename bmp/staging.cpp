@@ -9,11 +9,11 @@
 namespace pelm {
 namespace {
 
-void open_seekable(Staging &staging, int32_t stride, int64_t offset) {
+void open_seekable(Staging &staging, const BmpState &state, int32_t stride, int64_t offset) {
     // A place that the position's 32 bits cannot name lies behind the end of any stream.
     constexpr int64_t farthest = std::numeric_limits<int32_t>::max();
     ZOTARPELM_Seek_IO(staging.input, static_cast<int32_t>(std::min(offset, farthest)), 0);
-    staging.capacity = staging.input->bufferSize / stride * stride; // a caller's own buffer may be any size
+    staging.capacity = state.output.stagingBytes / stride * stride; // a caller's own buffer may be any size
     staging.bytes = staging.input->data;
 }
 
@@ -30,7 +30,7 @@ bool open_staging(Staging &staging, const BmpState &state, int64_t offset) {
     const int32_t stride = row_stride(state.width, state.bitsPerPixel);
     staging.input = state.input;
     if (state.input->kind == PELM_SOURCE_SEQUENTIAL) return open_sequential(staging, stride);
-    open_seekable(staging, stride, offset);
+    open_seekable(staging, state, stride, offset);
     return true;
 }
 

@@ -6,6 +6,12 @@
 #include "frame/export.h"
 #include "frame/request_layout.h"
 
+// Of a decode that has its output.
+struct BmpOutput {
+    OutputBuffer buffer;
+    int32_t stagingBytes; // kinds 0 and 2: of InputSource.data, whatever the caller makes of bufferSize later
+};
+
 // Allocated with ZOTARPELM_OsMalloc and zeroed. On a 32-bit system: 40 words in this order.
 struct BmpState {
     int32_t width;  // stored image, in pixels; above 0
@@ -37,7 +43,7 @@ struct BmpState {
     int32_t rowsDone; // output rows of earlier bands
     union {
         uint8_t headerCopy[54]; // a parked record's file header, before the output is known
-        OutputBuffer output;    // afterwards
+        BmpOutput output;       // afterwards
     };
 };
 

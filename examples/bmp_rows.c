@@ -5,6 +5,7 @@
  *     bmp_rows FILE.bmp WIDTH HEIGHT OUTPUT.ppm
  */
 #include <stdlib.h>
+#include <string.h>
 
 #include "PelmHost.h"
 
@@ -28,6 +29,8 @@ static const char *decode_by_rows(InputSource *source, uint8_t *band, int32_t bo
     info.input = source;
     info.outputFormat = PELM_FORMAT_RGB888;
     do {
+        /* Rows that a truncated file lacks are black. */
+        memset(band, 0, (size_t)box_width * BAND_ROWS * PIXEL_BYTES);
         const int32_t result = ZOTARPELMI_DecodeBMPLine(&info, band, box_width, box_height, BAND_ROWS);
         if (result == PELM_RESULT_FAILED) return "not a BMP that is decoded, or no memory";
         if (done == 0) fprintf(file, "P6\n%d %d\n255\n", (int)info.outputWidth, (int)info.outputHeight);

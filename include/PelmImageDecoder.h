@@ -36,8 +36,7 @@ enum {
     PELM_SOURCE_STREAM = 0,     /* read and seek services */
     PELM_SOURCE_MEMORY = 1,     /* `size` bytes at `data`, read in place */
     PELM_SOURCE_STREAM_ALT = 2, /* the same as 0 */
-    PELM_SOURCE_SEQUENTIAL =
-        4 /* read service only: BMP never moves it while it decodes rows. PNG needs seeks here too */
+    PELM_SOURCE_SEQUENTIAL = 4  /* read only, never moved while BMP rows are decoded; PNG needs seeks here too */
 };
 
 /*
@@ -123,10 +122,10 @@ typedef struct ImageDecodeInfo {
 } ImageDecodeInfo;
 
 /*
- * All decode calls: `output` is a buffer of outWidth x outHeight pixels of the output format, top row first, without
- * padding between rows and with any alignment. In placement PELM_PLACE_EXACT it is instead exactly as large as the
- * scaled image. Pixels that the image does not cover keep their contents, and nothing is written outside the
- * buffer. A NULL `info` gives 0; with a NULL `output` the decode runs and writes nothing.
+ * All decode calls, unless they say otherwise: `output` is a buffer of outWidth x outHeight pixels of the output
+ * format, top row first, without padding between rows and with any alignment. In placement PELM_PLACE_EXACT it is
+ * instead exactly as large as the scaled image. Pixels that the image does not cover keep their contents, and nothing
+ * is written outside the buffer. A NULL `info` gives 0; with a NULL `output` the decode runs and writes nothing.
  */
 
 /*
@@ -144,7 +143,8 @@ PELM_API int32_t ZOTARPELMI_DecodeBMP(ImageDecodeInfo *info, void *output, int32
  *
  * IterLine: the next `rows` rows of the scaled image, or as many as remain. Keep `rows` the same until the end: each
  * later band is placed by its own height, as if all before had been as high. 0 or fewer rows decode nothing.
- * PELM_RESULT_DONE, and then `decoderState` is NULL when the image is complete; or PELM_RESULT_FAILED.
+ * PELM_RESULT_DONE, and then `decoderState` is NULL when the image is complete; or PELM_RESULT_FAILED, and then a
+ * decode in progress is as it was: only a source that is gone fails a later band.
  *
  * Iter: the next 100 rows. PELM_RESULT_MORE while rows remain, then PELM_RESULT_DONE; or PELM_RESULT_FAILED.
  */
@@ -177,9 +177,9 @@ PELM_API int32_t ZOTARPELMI_DecodeBMPLine(ImageDecodeInfo *info, void *output, i
  *
  * DecodeBMPSKIA decodes into the box, which need not be what PreInit proposed. Leave the source where PreInit left it.
  * Kinds 0 and 2 need a staging buffer before the call: `data` from ZOTARPELM_OsMalloc, of `bufferSize` bytes, at least
- * a stored row. It BELONGS TO THE LIBRARY once the call has begun: it is freed, and `data` is NULL, when the call
- * returns. PELM_RESULT_DONE, and `decoderState` is NULL; or PELM_RESULT_FAILED, and then the record is freed and
- * `decoderState` STILL POINTS AT IT: set it to NULL before the request is used again, and never pass it on.
+ * a stored row. It BELONGS TO THE LIBRARY once the call has begun on a parked record: it is freed, and `data` is NULL,
+ * when the call returns. PELM_RESULT_DONE, and `decoderState` is NULL; or PELM_RESULT_FAILED, and then the record is
+ * freed and `decoderState` STILL POINTS AT IT: set it to NULL before the request is used again, and never pass it on.
  */
 PELM_API int32_t ZOTARPELMI_PreInitBMP(ImageDecodeInfo *info, int32_t sampleDivisor);
 PELM_API int32_t ZOTARPELMI_DecodeBMPSKIA(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight);
@@ -191,7 +191,8 @@ PELM_API int32_t PELMI_BMP_DestroyBMP(ImageDecodeInfo *info);
 /*
  * A whole WBMP of type 0, from memory (kind 1) or a seekable stream (kind 0 only). Writes formats 0, 1, 7 and 8, black
  * and white pixel for pixel, in five levels of grey where it is reduced; black is transparent (alpha 0) in the former.
- * `flags` must be PELM_PLACE_STRETCH to stretch; with any other value the image is fitted, and never turned.
+ * `flags` must be PELM_PLACE_STRETCH to stretch; with any other value, PELM_PLACE_EXACT too, the image is fitted into a
+ * buffer of outWidth x outHeight pixels, and never turned.
  * Returns PELM_RESULT_DONE, also when nothing is left of the image in the box (`outputWidth` and `outputHeight` are set
  * only when something is), or PELM_RESULT_FAILED, also for formats that it does not write.
  */

@@ -1,5 +1,6 @@
 // The calls of an iterative decode: what each leaves for the next one, what they allocate, and what an abort leaves.
 #include <climits>
+#include <utility>
 
 #include "bmp/working.h"
 #include "tests/bmp/bands.h"
@@ -263,6 +264,41 @@ TEST_F(BmpBandCalls, bands_allocate_nothing_of_their_own) {
         EXPECT_EQ(decode_by(calls_of(request, rows), source, request, 75).result, 1);
         EXPECT_EQ(host.allocations.size(), kind == PELM_SOURCE_MEMORY ? 2u : 3u);
     }
+}
+
+TEST_F(BmpBandCalls, a_later_proposal_for_the_row_buffer_does_not_change_it) {
+    for (const int32_t later : {INT_MIN, -1, 0, 3, 27, 4096, INT_MAX}) {
+        host.reset();
+        TestSource source(PELM_SOURCE_STREAM, file_bytes(noise_bmp(rgb24, 9, 40, false)), 60);
+        const BmpRequest request{1, 0, 0, 9, 40};
+        const auto calls = [&](ImageDecodeInfo &info, uint8_t *output) {
+            EXPECT_EQ(ZOTARPELMI_DecodeBMPIterLine(&info, output, 9, 40, 20), 1);
+            source.source.bufferSize = later;
+            return ZOTARPELMI_DecodeBMPIterLine(&info, output, 9, 40, 20);
+        };
+        const BmpDecode decode = decode_by(calls, source, request, 1080);
+        EXPECT_EQ(decode.result, 1);
+        EXPECT_EQ(decode.output, BmpSubject(noise_bmp(rgb24, 9, 40, false)).expect(request).output) << later;
+        for (const auto &read : host.reads)
+            EXPECT_LE(read.asked, 56) << later; // two rows
+    }
+}
+
+TEST_F(BmpBandCalls, a_source_that_is_gone_fails_a_later_band_and_keeps_the_decode) {
+    const Bytes file = file_bytes(noise_bmp(rgb24, 9, 7, false));
+    TestSource source(PELM_SOURCE_MEMORY, file);
+    const BmpRequest request{1, 0, 0, 9, 7};
+    const auto calls = [&](ImageDecodeInfo &info, uint8_t *output) {
+        EXPECT_EQ(ZOTARPELMI_DecodeBMPIterLine(&info, output, 9, 7, 4), 1);
+        uint8_t *const data = std::exchange(source.source.data, nullptr);
+        EXPECT_EQ(ZOTARPELMI_DecodeBMPIterLine(&info, output, 9, 7, 4), 0);
+        EXPECT_NE(info.decoderState, nullptr);
+        source.source.data = data;
+        return ZOTARPELMI_DecodeBMPIterLine(&info, output, 9, 7, 4);
+    };
+    const BmpDecode decode = decode_by(calls, source, request, 189);
+    EXPECT_EQ(decode.output, BmpSubject(noise_bmp(rgb24, 9, 7, false)).expect(request).output);
+    EXPECT_TRUE(decode.live_blocks.empty());
 }
 
 } // namespace

@@ -162,7 +162,7 @@ TEST_F(BmpLine, the_record_holds_the_count_of_rows_and_no_cursor) {
         ASSERT_NE(state, nullptr);
         EXPECT_EQ(state->rowsDone, done);
         EXPECT_EQ(state->rotation, 0);
-        EXPECT_EQ(state->output.size, 0u) << "a buffer of an earlier call";
+        EXPECT_EQ(state->output.buffer.size, 0u) << "a buffer of an earlier call";
     }
     EXPECT_EQ(lines.decode(2, 42), 1);
 }
@@ -366,6 +366,19 @@ TEST_F(BmpLine, a_decode_begun_by_lines_writes_nothing_when_iterated_and_the_oth
     EXPECT_EQ(Bytes(all.begin(), all.begin() + 18), Bytes(whole.begin(), whole.begin() + 18));
     EXPECT_EQ(band, Bytes(whole.begin() + 18, whole.end()));
     EXPECT_EQ(info.decoderState, nullptr);
+}
+
+TEST_F(BmpLine, the_box_is_no_buffer_and_may_be_of_any_height) {
+    for (const auto &[width, height] : {std::pair{100, INT_MAX}, std::pair{30000, 200000}}) {
+        const BmpRequest request{7, 0, 0, width, height};
+        Lines lines(noise_bmp(rgb24, 10, 10, false), PELM_SOURCE_MEMORY, request);
+        EXPECT_EQ(lines.decode(2, static_cast<size_t>(width) * 8), 1);
+        const Bytes untouched(lines.band().size(), background);
+        EXPECT_NE(lines.band(), untouched);
+        EXPECT_NE(lines.info().decoderState, nullptr);
+        EXPECT_EQ(lines.decode(8, static_cast<size_t>(width) * 32), 1);
+        EXPECT_EQ(lines.info().decoderState, nullptr);
+    }
 }
 
 } // namespace

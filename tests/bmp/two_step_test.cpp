@@ -267,8 +267,8 @@ TEST_F(BmpTwoStep, the_completed_record_holds_the_box_and_the_compression) {
     EXPECT_EQ(state->rotation, 90);
     EXPECT_EQ(state->topDown, 1u);
     EXPECT_EQ(state->rowsDone, 0);
-    EXPECT_EQ(state->output.start, output.data());
-    EXPECT_EQ(state->output.size, 126u);
+    EXPECT_EQ(state->output.buffer.start, output.data());
+    EXPECT_EQ(state->output.buffer.size, 126u);
     PELMI_BMP_DeleteDecInfo(state);
     EXPECT_TRUE(host.live_blocks().empty());
 }
