@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "tools/failure.h"
+#include "tools/line_buffer.h"
 
 namespace pelm_tool {
 namespace {
@@ -21,51 +22,10 @@ int32_t decode_in_slices(DecodeJob &job) {
     return result;
 }
 
-// The calls by lines write at the left of a buffer of their own; where the rows belong in the picture is up to us.
-class LineBuffer {
-public:
-    LineBuffer(DecodeJob &job, int32_t lines);
-    // The next lines, from `row` of the image on.
-    int32_t decode(int32_t row);
-
-private:
-    uint8_t *line(int32_t number) { return lines_.data() + static_cast<size_t>(number) * stride_; }
-    uint8_t *place_of(int32_t row); // nullptr: outside of the picture
-
-    DecodeJob &job_;
-    int32_t count_;
-    size_t stride_;    // bytes
-    size_t row_bytes_; // of the image
-    int32_t left_, top_;
-    std::vector<uint8_t> lines_;
-};
-
-LineBuffer::LineBuffer(DecodeJob &job, int32_t lines) : job_(job), count_(lines) {
-    const Picture &picture = *job.picture;
-    stride_ = static_cast<size_t>(job.box.width) * picture.format->bytes;
-    row_bytes_ = static_cast<size_t>(job.info.outputWidth) * picture.format->bytes;
-    left_ = (static_cast<int32_t>(picture.width) - job.info.outputWidth) / 2;
-    top_ = (static_cast<int32_t>(picture.height) - job.info.outputHeight) / 2;
-    if (keeps_its_size(job.image, job.box, job.info.flags)) top_ += static_cast<int32_t>(job.image.frames[0].top);
-    lines_.resize(static_cast<size_t>(lines) * stride_);
-}
-
-uint8_t *LineBuffer::place_of(int32_t row) {
-    Picture &picture = *job_.picture;
-    const int64_t y = int64_t{top_} + row;
-    if (y >= static_cast<int64_t>(picture.height)) return nullptr;
-    const size_t pixel = static_cast<size_t>(y) * picture.width + static_cast<size_t>(left_);
-    return picture.bytes.data() + pixel * picture.format->bytes;
-}
-
-// What a call leaves as it is keeps what the picture holds there.
-int32_t LineBuffer::decode(int32_t row) {
-    for (int32_t i = 0; i < count_; ++i)
-        if (const uint8_t *const from = place_of(row + i)) std::copy_n(from, row_bytes_, line(i));
-    const int32_t result = ZOTARPELMI_DecodeGIFLine(&job_.info, lines_.data(), job_.box.width, job_.box.height, count_);
-    for (int32_t i = 0; i < count_; ++i)
-        if (uint8_t *const to = place_of(row + i)) std::copy_n(line(i), row_bytes_, to);
-    return result;
+LinePlace place_of_lines(const DecodeJob &job) {
+    LinePlace place = centred_lines(job);
+    if (keeps_its_size(job.image, job.box, job.info.flags)) place.top += static_cast<int32_t>(job.image.frames[0].top);
+    return place;
 }
 
 void refuse_what_lines_cannot_do(const DecodeJob &job) {
@@ -82,11 +42,14 @@ int32_t decode_by_lines(DecodeJob &job, int32_t lines) {
     if (measure_gif(job.info, job.box) != PELM_RESULT_DONE) return PELM_RESULT_FAILED;
     const int32_t most_rows = std::max(job.image.stored_rows, job.info.outputHeight);
     const int32_t count = std::clamp(lines, 1, std::max(most_rows, 1));
-    LineBuffer buffer(job, count);
-    int32_t row = 0;
-    int32_t result = buffer.decode(row);
+    LineBuffer buffer(*job.picture, place_of_lines(job), count);
+    const auto decode = [&](uint8_t *output) {
+        return ZOTARPELMI_DecodeGIFLine(&job.info, output, job.box.width, job.box.height, count);
+    };
+    int64_t row = 0;
+    int32_t result = buffer.fill(row, decode);
     while (result == PELM_RESULT_DONE && job.info.decoderState != nullptr && row <= most_rows)
-        result = buffer.decode(row += count);
+        result = buffer.fill(row += count, decode);
     ZOTARPELMI_AbortGIFIter(&job.info);
     const bool is_short = row > 0 && !job.image.shortage.empty();
     return is_short ? int32_t{PELM_RESULT_DONE} : result;
