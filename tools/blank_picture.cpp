@@ -1,5 +1,7 @@
 #include "tools/blank_picture.h"
 
+#include <algorithm>
+
 #include "tools/failure.h"
 
 namespace pelm_tool {
@@ -13,10 +15,14 @@ bool is_quarter_turn(const Options &options) {
 
 } // namespace
 
+Box divided(const ImageDescription &image, int32_t divisor) {
+    return {std::max(image.width / divisor, 1), std::max(image.height / divisor, 1)};
+}
+
 Box box_for(const Options &options, const ImageDescription &image) {
     if (options.box) return *options.box;
-    if (is_quarter_turn(options)) return {image.height, image.width};
-    return {image.width, image.height};
+    const Box size = divided(image, options.mode.divisor);
+    return is_quarter_turn(options) ? Box{size.height, size.width} : size;
 }
 
 std::string size_words(int64_t width, int64_t height) {

@@ -7,6 +7,9 @@
 
 namespace pelm_tool {
 
+// The image's size over the divisor, at least 1 x 1.
+Box divided(const ImageDescription &image, int32_t divisor);
+
 Box box_for(const Options &options, const ImageDescription &image);
 
 std::string size_words(int64_t width, int64_t height);

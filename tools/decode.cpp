@@ -53,7 +53,8 @@ bool is_decoded_from_memory(const Decoding &decoding) {
 }
 
 // Why a file is refused that looks sound from the outside.
-Failure refusal_of(const Decoding &decoding, const DecodeJob &job) {
+Failure refusal_of(const Decoding &decoding, const DecodeJob &job, int32_t result) {
+    if (result == PELM_RESULT_DATA_ENDED) return Failure("the input has become shorter while it was read");
     if (!decoding.image.polls_rows) return Failure("the decoder refuses it");
     const bool is_stream = decoding.input.source()->kind != PELM_SOURCE_MEMORY;
     if (is_stream && is_decoded_from_memory(decoding))
@@ -67,7 +68,7 @@ void throw_if_failed(const Decoding &decoding, const DecodeJob &job, int32_t res
     decoding.session.throw_if_stopped();
     decoding.session.throw_if_out_of_memory();
     decoding.input.throw_if_unreadable();
-    if (result != PELM_RESULT_DONE) throw refusal_of(decoding, job);
+    if (result != PELM_RESULT_DONE) throw refusal_of(decoding, job, result);
 }
 
 struct RunResult {
@@ -184,11 +185,6 @@ Decoded decode(Input &input, const ImageFormat &image, const ImageDescription &d
     }
     if (image.never_turns && options.rotation != PELM_ROTATE_0)
         throw Failure(std::string("the ") + image.name + " decoder does not turn images");
-    if (description.is_interlaced && options.mode.calls == Calls::by_lines)
-        throw Failure("an interlaced image cannot be decoded by lines");
-    if (options.mode.calls != Calls::one_shot && !image.decodes_in_calls) {
-        throw Failure(std::string("the ") + image.name + " decoder has only --mode oneshot");
-    }
     const Decoding decoding{input, image, description, options, session, box_for(options, description)};
     refuse_huge(decoding.box, *options.format);
     if (image.polls_rows) session.show_rows(description.height);

@@ -70,7 +70,8 @@ int32_t measure_gif(ImageDecodeInfo &info, Box box) {
 int32_t decode_gif(DecodeJob &job) {
     if (job.picture == nullptr) return measure_gif(job.info, job.box);
     switch (job.mode.calls) {
-    case Calls::one_shot: break;
+    case Calls::one_shot:
+    case Calls::in_two_steps: break; // the latter is for BMP only
     case Calls::iterative: return decode_in_slices(job);
     case Calls::by_lines: return decode_by_lines(job, job.mode.lines);
     }

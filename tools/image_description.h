@@ -16,7 +16,9 @@ constexpr size_t described_bytes = 66;
 struct ImageDescription {
     int32_t width = 0; // as decoded; 0 when the image is refused before it is known
     int32_t height = 0;
-    int32_t stored_rows = 0; // PNG: rows of the image data; of all passes together when it is interlaced
+    int32_t stored_rows = 0;      // PNG: rows of the image data; of all passes together when it is interlaced
+    int32_t row_bytes = 0;        // BMP: of a stored row
+    uint32_t run_length_bits = 0; // BMP: of an index, where run-length codes are decoded
     bool is_interlaced = false;
     bool is_grey_8 = false;           // PNG: grey of 8 bits in plain rows, which is reduced by rules of its own
     std::string words;                // size, depth and variant

@@ -3,6 +3,8 @@
 #include <cstring>
 #include <string>
 
+#include "tools/bmp_codes.h"
+#include "tools/bmp_decode.h"
 #include "tools/bmp_description.h"
 #include "tools/failure.h"
 #include "tools/gif_decode.h"
@@ -33,24 +35,22 @@ bool is_bmp(Bytes head) {
     return begins_with(head, "BM");
 }
 
-ImageDescription describe_bmp_input(Input &input) {
-    return describe_bmp(input.head(), {input.size(), input.source()->kind});
+ImageDescription describe_bmp_input(Input &input, Mode mode) {
+    ImageDescription description = describe_bmp(input.head(), {input.size(), input.source()->kind}, mode);
+    if (description.run_length_bits != 0) describe_codes(description, input.all_bytes());
+    return description;
 }
 
-ImageDescription describe_png_input(Input &input) {
+ImageDescription describe_png_input(Input &input, Mode) {
     return describe_png(*input.source());
 }
 
-ImageDescription describe_wbmp_input(Input &input) {
+ImageDescription describe_wbmp_input(Input &input, Mode) {
     return describe_wbmp(input.head(), {input.size(), input.source()->kind});
 }
 
-ImageDescription describe_gif_input(Input &input) {
+ImageDescription describe_gif_input(Input &input, Mode) {
     return describe_gif(*input.source(), input.head());
-}
-
-int32_t decode_bmp(DecodeJob &job) {
-    return ZOTARPELMI_DecodeBMP(&job.info, job.output(), job.box.width, job.box.height);
 }
 
 // The decoder knows no exact placement: the first run, without a picture, fits the image, and the second one gets a
@@ -67,8 +67,23 @@ int32_t decode_wbmp(DecodeJob &job) {
 }
 
 constexpr ImageFormat image_formats[] = {
-    {"BMP", is_bmp, describe_bmp_input, decode_bmp, common_formats, false, false, false, false},
-    {"PNG", begins_like_png, describe_png_input, decode_png, common_formats, true, true, true, true},
+    {.name = "BMP",
+     .recognises = is_bmp,
+     .describe = describe_bmp_input,
+     .decode = decode_bmp,
+     .written_formats = common_formats,
+     .pipe_use = PipeUse::front_to_back_if_asked,
+     .decodes_in_calls = true,
+     .decodes_in_two_steps = true},
+    {.name = "PNG",
+     .recognises = begins_like_png,
+     .describe = describe_png_input,
+     .decode = decode_png,
+     .written_formats = common_formats,
+     .is_read_from_memory = true,
+     .polls_rows = true,
+     .decodes_in_calls = true,
+     .turns_only_reduced = true},
     {.name = "GIF",
      .recognises = begins_like_gif,
      .describe = describe_gif_input,
@@ -82,10 +97,19 @@ constexpr ImageFormat image_formats[] = {
      .describe = describe_wbmp_input,
      .decode = decode_wbmp,
      .written_formats = wbmp_formats,
+     .pipe_use = PipeUse::with_seeks,
      .never_turns = true,
-     .needs_seeks = true,
      .black_is_clear = true},
 };
+
+std::string why_mode_is_refused(const ImageFormat &image, const ImageDescription &description, Calls calls) {
+    if (calls == Calls::one_shot) return {};
+    const std::string decoder = std::string("the ") + image.name + " decoder has ";
+    if (calls == Calls::in_two_steps) return image.decodes_in_two_steps ? "" : decoder + "no --mode skia";
+    if (!image.decodes_in_calls) return decoder + "only --mode oneshot";
+    const bool is_in_passes = description.is_interlaced && calls == Calls::by_lines;
+    return is_in_passes ? "an interlaced image cannot be decoded by lines" : "";
+}
 
 } // namespace
 
@@ -97,9 +121,17 @@ const ImageFormat &recognise(Bytes head) {
     throw Failure("not a BMP, PNG, GIF or WBMP file (it begins like none of them)");
 }
 
-ImageDescription describe(const ImageFormat &image, Input &input) {
-    const ImageDescription description = image.describe(input);
+// What can be read front to back on request is so in one call only.
+void settle(Input &input, const ImageFormat &image, Mode mode) {
+    PipeUse use = image.pipe_use;
+    if (use == PipeUse::front_to_back_if_asked && mode.calls != Calls::one_shot) use = PipeUse::with_seeks;
+    input.settle(image.is_read_from_memory, use);
+}
+
+ImageDescription describe(const ImageFormat &image, Input &input, Mode mode) {
+    ImageDescription description = image.describe(input, mode);
     input.throw_if_unreadable();
+    if (description.refusal.empty()) description.refusal = why_mode_is_refused(image, description, mode.calls);
     return description;
 }
 

@@ -71,8 +71,8 @@ void Input::read_head() {
     if (delivered < 1) throw_if_unreadable();
 }
 
-void Input::settle(bool in_memory, bool needs_seeks) {
-    if (needs_seeks && source_.kind == pipe_kind) source_.kind = PELM_SOURCE_STREAM; // it is spooled
+void Input::settle(bool in_memory, PipeUse use) {
+    if (use == PipeUse::with_seeks && source_.kind == pipe_kind) source_.kind = PELM_SOURCE_STREAM; // it is spooled
     if (choice_ != SourceChoice::automatic) return;
     const bool is_in_memory = source_.kind == PELM_SOURCE_MEMORY;
     if (in_memory && !is_in_memory) {
@@ -80,7 +80,7 @@ void Input::settle(bool in_memory, bool needs_seeks) {
         choice_ = SourceChoice::memory;
         open();
         read_head();
-    } else if (!in_memory && !needs_seeks && is_in_memory) {
+    } else if (!in_memory && use == PipeUse::front_to_back && is_in_memory) {
         const int error = PelmHost_OpenMemory(&view_, pipe_kind, source_.data, source_.size);
         if (error != 0) throw cannot_read(error);
         is_viewed_ = true;

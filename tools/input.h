@@ -11,6 +11,13 @@ namespace pelm_tool {
 
 enum class SourceChoice { automatic, memory, file, pipe };
 
+// How a decoder reads a pipe, all of whose bytes are there.
+enum class PipeUse {
+    front_to_back,
+    front_to_back_if_asked, // and from memory otherwise
+    with_seeks
+};
+
 class Input {
 public:
     Input(const std::string &name, SourceChoice choice); // "-" is standard input; throws Failure
@@ -18,9 +25,9 @@ public:
     Input(const Input &) = delete;
     Input &operator=(const Input &) = delete;
 
-    // Where the choice was automatic: makes it a memory source, or leaves it the file or pipe that it is. The bytes of
-    // a pipe are given front to back, or with `needs_seeks` in any order. Throws Failure.
-    void settle(bool in_memory, bool needs_seeks);
+    // Where the choice was automatic: makes it a memory source, or leaves it the file or pipe that it is, with the
+    // bytes of the latter as the decoder reads them. Throws Failure.
+    void settle(bool in_memory, PipeUse use);
 
     InputSource *source() { return is_viewed_ ? &view_ : &source_; }
     Bytes head() const { return head_; } // the first `described_bytes`, or the whole of a shorter file

@@ -162,8 +162,8 @@ Outcome Run::decode_one(const std::string &name, const OutputName *output) {
     Session session(options_, progress_);
     Input input(name, options_.source);
     const ImageFormat &format = recognise(input.head());
-    input.settle(format.is_read_from_memory, format.needs_seeks);
-    const ImageDescription image = describe(format, input);
+    settle(input, format, options_.mode);
+    const ImageDescription image = describe(format, input, options_.mode);
     session.throw_if_stopped();
     if (options_.info) return describe_one(name, image);
 

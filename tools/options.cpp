@@ -26,17 +26,24 @@ frames and plays them with their delays (what lies below 20 ms is shown for 100,
 says; opened as PAGE#3 it shows the third frame. What no frame has painted yet is clear in rgba and white otherwise,
 also with --background.
 
-Sources: a PNG is decoded from memory. The others are read as a seekable file when it is a named one, as a pipe
-otherwise. A pipe is first read to its end into memory, then decoded front to back. The decoder takes the rows of a
-BMP pipe from right behind the headers, whatever the header says, and writes those of a top-down BMP upwards: use
---source memory for such files. From file or pipe some PNGs cannot be decoded (a chunk begins across the decoder's
-buffer). A WBMP is read as a seekable file, also with --source pipe, or from memory when it comes through a pipe.
+Sources: a PNG is decoded from memory. The others are read as a seekable file when it is a named one. A pipe is first
+read to its end into memory; a GIF is then decoded front to back, BMP and WBMP from memory. With --source pipe a BMP
+is decoded front to back as well, if it is in one call: the decoder then takes the rows from right behind the headers,
+whatever the header says, and writes those of a top-down BMP upwards (the tool warns). With the other modes, and for
+WBMP, --source pipe is a file that can seek. From file or pipe some PNGs cannot be decoded (a chunk begins across the
+decoder's buffer).
 
-Modes (PNG, GIF): oneshot decodes in one call, iter block by block, line=N by calls for N rows each; the picture is
-the same. iter turns to oneshot when the first block brings no row, and to line=16 for grey of 8 bits that is reduced.
-An interlaced PNG cannot be decoded by lines; reduced, it goes through the frame buffer, where in rgb565 and rgb only
-transparency by tRNS lets the background through. A GIF can be decoded by lines only as it lies, neither interlaced
-nor turned, and not frame by frame.
+Modes: oneshot decodes in one call. The others leave the same picture:
+  iter     by bands of 100 rows (BMP), by blocks (PNG), by slices (GIF). PNG: turns to oneshot when the first block
+           brings no row, and to line=16 for grey of 8 bits that is reduced.
+  line=N   by calls for N rows each. A BMP or GIF is then not turned. An interlaced image cannot be decoded so, nor
+           can frames.
+  skia=N   BMP: in two steps, as a graphics library does, to 1/N of the size; skia is skia=1. With --box that is the
+           size. Only this mode decodes headers of 108 and 124 bytes, RLE8 and RLE4; it takes no uncompressed file
+           that is cut short. Palettes behind such headers are read from the wrong place: the colours of indexed
+           images are wrong then. Moves in run-length codes are not made. The tool warns of both.
+An interlaced PNG, reduced, goes through the frame buffer, where in rgb565 and rgb only transparency by tRNS lets the
+background through.
 
 Placement: fit reduces the image to the box (it never enlarges), keeps its shape and centres it. stretch fills the
 box. exact reduces as fit does; the output is just the image. With exact and a quarter turn the decoder does not swap
@@ -125,15 +132,20 @@ const PixelFormat *parse_format(const std::string &text) {
     return format;
 }
 
+// The number above 0 that follows `name` in `text`.
+std::optional<int32_t> number_after(std::string_view name, std::string_view text) {
+    if (!text.starts_with(name)) return std::nullopt;
+    const auto number = to_number<int32_t>(text.substr(name.size()));
+    return number && *number > 0 ? number : std::nullopt;
+}
+
 Mode parse_mode(const std::string &text) {
     if (text == "oneshot") return {Calls::one_shot};
     if (text == "iter") return {Calls::iterative};
-    constexpr std::string_view by_lines = "line=";
-    if (text.starts_with(by_lines)) {
-        const auto lines = to_number<int32_t>(std::string_view(text).substr(by_lines.size()));
-        if (lines && *lines > 0) return {Calls::by_lines, *lines};
-    }
-    throw mistake("--mode", text, "oneshot, iter or line=N with N above 0");
+    if (text == "skia") return {Calls::in_two_steps};
+    if (const auto lines = number_after("line=", text)) return {Calls::by_lines, *lines};
+    if (const auto divisor = number_after("skia=", text)) return {Calls::in_two_steps, 0, *divisor};
+    throw mistake("--mode", text, "oneshot, iter, line=N, skia or skia=N with N above 0");
 }
 
 // An option that takes one of the names in `values`.
@@ -176,8 +188,8 @@ void add_run_options(CLI::App &app, Options &options) {
         app, "--source", options.source,
         {{"memory", SourceChoice::memory}, {"file", SourceChoice::file}, {"pipe", SourceChoice::pipe}},
         "memory|file|pipe", "How the decoder reads the input");
-    add_parsed(app, "--mode", options.mode, parse_mode, "oneshot|iter|line=N",
-               "How many calls decode the image; default: oneshot");
+    add_parsed(app, "--mode", options.mode, parse_mode, "oneshot|iter|line=N|skia[=N]",
+               "Which calls decode the image; default: oneshot");
     app.add_flag("--frame-buffer", options.frame_buffer,
                  "Write an interlaced PNG from a frame buffer; always done where it is reduced");
     add_parsed(app, "--max-memory", options.max_memory, parse_bytes, "BYTES[k|M]",

@@ -16,11 +16,12 @@ struct Box {
     int32_t height;
 };
 
-enum class Calls { one_shot, iterative, by_lines };
+enum class Calls { one_shot, iterative, by_lines, in_two_steps };
 
 struct Mode {
     Calls calls = Calls::one_shot;
-    int32_t lines = 0; // per call, of by_lines
+    int32_t lines = 0;   // per call, of by_lines
+    int32_t divisor = 1; // of the size, of in_two_steps
 };
 
 enum class OutputType { png, ppm, pam, raw };

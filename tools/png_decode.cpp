@@ -135,7 +135,8 @@ bool keeps_its_size(const ImageDescription &image, Box box, uint32_t flags) {
 int32_t decode_png(DecodeJob &job) {
     if (job.picture == nullptr) return decode_at_once(job);
     switch (job.mode.calls) {
-    case Calls::one_shot: break;
+    case Calls::one_shot:
+    case Calls::in_two_steps: break; // the latter is for BMP only
     case Calls::by_lines: return decode_by_lines(job, job.mode.lines);
     case Calls::iterative:
         // Every call of a reduced grey image starts at the top of its buffer, and it cannot be told how far it got.

@@ -60,6 +60,9 @@ TEST_F(ToolCommandLine, mistakes_are_told_in_one_line) {
         {in, "-o", out, "--mode", "line"},
         {in, "-o", out, "--mode", "line=0"},
         {in, "-o", out, "--mode", "line=x"},
+        {in, "-o", out, "--mode", "skia=0"},
+        {in, "-o", out, "--mode", "skia="},
+        {in, "-o", out, "--mode", "skia=2147483648"},
         {in, "-o", out, "--background", "red"},
         {in, "-o", out, "--background", "12345"},
         {in, "-o", out, "--max-memory", "lots"},
@@ -111,8 +114,10 @@ TEST_F(ToolCommandLine, info_tells_how_a_pipe_is_read) {
     const std::string name = write("x.bmp", file);
     EXPECT_EQ(run({"--info", name}).out,
               name + ": 4x4, 24 bits per pixel, BMP with a 40-byte header, top-down, uncompressed; decoded\n");
+    EXPECT_EQ(run({"--info", "-"}, name).out,
+              "standard input: 4x4, 24 bits per pixel, BMP with a 40-byte header, top-down, uncompressed; decoded\n");
     EXPECT_EQ(
-        run({"--info", "-"}, name).out,
+        run({"--info", "-", "--source", "pipe"}, name).out,
         "standard input: 4x4, 24 bits per pixel, BMP with a 40-byte header, top-down, uncompressed; decoded; note: "
         "from a pipe the rows are read at byte 54 instead of 64; use --source memory; note: from a pipe the rows "
         "of a top-down file are written upwards; use --source memory\n");

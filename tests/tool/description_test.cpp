@@ -10,19 +10,38 @@
 namespace pelm::test {
 namespace {
 
+using pelm_tool::Calls;
 using pelm_tool::describe_bmp;
 using pelm_tool::described_bytes;
 using pelm_tool::ImageDescription;
 
-ImageDescription described(const Bytes &bytes, uint32_t kind) {
+using pelm_tool::Mode;
+
+constexpr Mode at_once = {};
+constexpr Mode in_two_steps = {Calls::in_two_steps};
+
+ImageDescription described(const Bytes &bytes, uint32_t kind, Mode mode = at_once) {
     const pelm_tool::Bytes head(bytes.data(), std::min(bytes.size(), described_bytes));
-    return describe_bmp(head, {static_cast<int64_t>(bytes.size()), kind});
+    return describe_bmp(head, {static_cast<int64_t>(bytes.size()), kind}, mode);
 }
+
+constexpr uint32_t row_buffer_bytes = 1u << 19;
 
 enum class Verdict { refused, decoded, too_large_to_try };
 
+int32_t decode_with(ImageDecodeInfo &info, Mode mode) {
+    if (mode.calls == Calls::one_shot) return ZOTARPELMI_DecodeBMP(&info, nullptr, 4, 4);
+    if (ZOTARPELMI_PreInitBMP(&info, 1) != PELM_RESULT_DONE) return PELM_RESULT_FAILED;
+    InputSource &source = *info.input;
+    if (source.kind != PELM_SOURCE_MEMORY) {
+        source.bufferSize = static_cast<int32_t>(row_buffer_bytes);
+        source.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(row_buffer_bytes));
+    }
+    return ZOTARPELMI_DecodeBMPSKIA(&info, nullptr, 4, 4);
+}
+
 // The test host takes back what a refusal leaves allocated.
-Verdict decoded(const Bytes &bytes, uint32_t kind) {
+Verdict decoded(const Bytes &bytes, uint32_t kind, Mode mode) {
     TestHost &host = TestHost::get();
     host.reset();
     host.faults.largest_block = 1u << 20; // what is filled takes time
@@ -30,7 +49,7 @@ Verdict decoded(const Bytes &bytes, uint32_t kind) {
     ImageDecodeInfo info = {};
     info.input = &source.source;
     info.outputFormat = PELM_FORMAT_RGB888;
-    const int32_t result = ZOTARPELMI_DecodeBMP(&info, nullptr, 4, 4);
+    const int32_t result = decode_with(info, mode);
     const bool too_large = std::any_of(host.allocations.begin(), host.allocations.end(),
                                        [&](uint32_t size) { return size > host.faults.largest_block; });
     host.reset();
@@ -86,7 +105,7 @@ TEST(ToolDescription, refuses_what_the_decoder_refuses) {
         for (const uint32_t kind :
              {PELM_SOURCE_STREAM, PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM_ALT, PELM_SOURCE_SEQUENTIAL}) {
             const ImageDescription image = described(bytes, kind);
-            const Verdict verdict = decoded(bytes, kind);
+            const Verdict verdict = decoded(bytes, kind, at_once);
             if (yields_nothing(image.refusal) || verdict == Verdict::too_large_to_try) continue;
             ASSERT_EQ(verdict == Verdict::refused, !image.refusal.empty())
                 << "case " << i << ", kind " << kind << ", " << image.words << ": " << image.refusal;
@@ -94,6 +113,74 @@ TEST(ToolDescription, refuses_what_the_decoder_refuses) {
         }
     }
     EXPECT_GT(refused, quick() ? 2000 : 20000);
+}
+
+// Rows that do not fit the row buffer of this test are no matter of the file.
+bool fits_row_buffer(const ImageDescription &image) {
+    return image.row_bytes <= static_cast<int32_t>(row_buffer_bytes);
+}
+
+TEST(ToolDescription, refuses_what_the_decoder_refuses_in_two_steps) {
+    Chooser choose(2);
+    int refused = 0;
+    int taken = 0;
+    for (int i = 0; i < (quick() ? 2000 : 20000); ++i) {
+        Bytes bytes = file_bytes(odd_file(choose));
+        if (choose.one_in(5)) bytes.resize(2 + choose.below(static_cast<uint32_t>(bytes.size()) - 2));
+        for (const uint32_t kind : {PELM_SOURCE_STREAM, PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM_ALT}) {
+            const ImageDescription image = described(bytes, kind, in_two_steps);
+            const Verdict verdict = decoded(bytes, kind, in_two_steps);
+            if (yields_nothing(image.refusal) || verdict == Verdict::too_large_to_try) continue;
+            if (!fits_row_buffer(image)) continue;
+            ASSERT_EQ(verdict == Verdict::refused, !image.refusal.empty())
+                << "case " << i << ", kind " << kind << ", " << image.words << ": " << image.refusal;
+            ++(verdict == Verdict::refused ? refused : taken);
+        }
+    }
+    EXPECT_GT(refused, quick() ? 1000 : 10000);
+    EXPECT_GT(taken, quick() ? 1000 : 10000);
+}
+
+TEST(ToolDescription, points_at_two_steps_only_where_they_help) {
+    BmpFile file = noise_bmp(variant_named("eight_bits"), 7, 5, true);
+    const auto refusal = [&] { return described(file_bytes(file), PELM_SOURCE_STREAM).refusal; };
+    for (const uint32_t size : {52u, 108u, 124u}) {
+        const std::string words = "BMP header of " + std::to_string(size) + " bytes is not supported";
+        file.header_size = size;
+        file.compression = 0;
+        EXPECT_EQ(refusal(), words + "; use --mode skia");
+        file.compression = 4;
+        EXPECT_EQ(refusal(), words);
+    }
+    file.header_size = 16;
+    file.compression = 0;
+    EXPECT_EQ(refusal(), "BMP header of 16 bytes is not supported");
+    file.header_size = 40;
+    file.compression = 1;
+    EXPECT_EQ(refusal(), "RLE8 compression is not supported; use --mode skia");
+    file.compression = 5;
+    EXPECT_EQ(refusal(), "PNG compression is not supported");
+}
+
+TEST(ToolDescription, tells_what_is_odd_in_two_steps) {
+    const auto notes_on = [](const BmpFile &file) {
+        const std::vector<std::string> notes = described(file_bytes(file), PELM_SOURCE_STREAM, in_two_steps).notes;
+        return testing::PrintToString(notes);
+    };
+    BmpFile file = noise_bmp(variant_named("eight_bits"), 7, 5, false);
+    EXPECT_EQ(notes_on(file), "{}");
+    file.header_size = 124;
+    EXPECT_EQ(notes_on(file), "{ \"the palette behind a 124-byte header is read from the wrong place\" }");
+    file.header_size = 40;
+    file.compression = 2;
+    EXPECT_EQ(notes_on(file), "{ \"RLE4 compression at 8 bits per pixel is taken for uncompressed rows\" }");
+    file.compression = 0;
+    file.pixel_data_offset = 54;
+    EXPECT_EQ(notes_on(file),
+              "{ \"there is no room for a palette in front of the pixels, so all of them are black\" }");
+    file = noise_bmp(variant_named("twenty_four_bits"), 7, 5, false);
+    file.header_size = 16;
+    EXPECT_EQ(notes_on(file), "{ \"the header of 16 bytes is read as one of 40 bytes, so size and depth are wrong\" }");
 }
 
 TEST(ToolDescription, knows_the_size_of_what_is_decoded) {

@@ -126,13 +126,80 @@ TEST_F(ToolPhotos, with_long_headers_are_refused_in_one_line) {
     const struct {
         const char *name;
         int header_size;
-    } cases[] = {{"harvesters.bmp", 124},   {"bricks-gray.bmp", 108},        {"bricks-dither.bmp", 124},
-                 {"hippopotamus.bmp", 124}, {"hibiscus.primitive.bmp", 124}, {"pjw-thumbnail.bmp", 124}};
+    } cases[] = {{"harvesters.bmp", 124},
+                 {"bricks-gray.bmp", 108},
+                 {"bricks-dither.bmp", 124},
+                 {"hippopotamus.bmp", 124},
+                 {"pjw-thumbnail.bmp", 124}};
     for (const auto &one : cases) {
         if (!is_there(one.name)) continue;
         const std::string file = (image_folder() / one.name).string();
         expect_failure({file, "-o", path("x.png")}, file,
-                       "BMP header of " + std::to_string(one.header_size) + " bytes is not supported");
+                       "BMP header of " + std::to_string(one.header_size) + " bytes is not supported; use --mode skia");
+    }
+}
+
+TEST_F(ToolPhotos, with_bit_fields_at_32_bits_are_refused_by_every_mode) {
+    if (!is_there("hibiscus.primitive.bmp")) return;
+    const std::string file = (image_folder() / "hibiscus.primitive.bmp").string();
+    expect_failure({file, "-o", path("x.png")}, file, "BMP header of 124 bytes is not supported");
+    expect_failure({file, "--mode", "skia", "-o", path("x.png")}, file,
+                   "bit fields at 32 bits per pixel are not supported");
+}
+
+TEST_F(ToolPhotos, with_long_headers_decode_in_two_steps) {
+    for (const std::string name : {"bricks-color", "harvesters", "hat", "hibiscus.regular", "hippopotamus"}) {
+        if (!is_there(name + ".bmp")) continue;
+        const fs::path file = image_folder() / (name + ".bmp");
+        const fs::path png =
+            image_folder() / (fs::exists(image_folder() / (name + ".png")) ? name + ".png" : name + ".regular.png");
+        for (const std::string source : {"memory", "file", "pipe"}) {
+            const ToolRun got = run({file.string(), "--mode", "skia", "--source", source, "-o", path("x.png")});
+            EXPECT_EQ(got.status, 0) << got.err;
+            EXPECT_EQ(got.err, "") << name;
+            EXPECT_EQ(difference(read_png_samples(png), read_png(path("x.png"))), "") << name << ", " << source;
+        }
+    }
+}
+
+// The same with a header of 40 bytes, and the palette where the decoder looks for it.
+Bytes with_plain_header(const Bytes &bmp) {
+    const size_t header_size = bmp[14];
+    const size_t entries = bmp[28] == 1 ? 2 : 256;
+    const uint32_t pixels = bmp[10] | uint32_t{bmp[11]} << 8;
+    Bytes result(bmp.begin(), bmp.begin() + 54);
+    result[14] = 40;
+    const uint32_t new_pixels = static_cast<uint32_t>(54 + 4 * entries);
+    result[10] = static_cast<uint8_t>(new_pixels);
+    result[11] = static_cast<uint8_t>(new_pixels >> 8);
+    const auto palette = bmp.begin() + static_cast<ptrdiff_t>(14 + header_size);
+    result.insert(result.end(), palette, palette + static_cast<ptrdiff_t>(4 * entries));
+    result.insert(result.end(), bmp.begin() + static_cast<ptrdiff_t>(pixels), bmp.end());
+    return result;
+}
+
+TEST_F(ToolPhotos, with_long_headers_and_a_palette_come_with_a_warning_and_wrong_colours) {
+    const struct {
+        std::string name;
+        const char *header_size;
+    } cases[] = {
+        {"bricks-gray", "108"}, {"bricks-dither", "124"}, {"bricks-nodither", "124"}, {"pjw-thumbnail", "124"}};
+    for (const auto &one : cases) {
+        if (!is_there(one.name + ".bmp")) continue;
+        const std::string file = (image_folder() / (one.name + ".bmp")).string();
+        const Image expected = read_png_samples(image_folder() / (one.name + ".png"));
+        const ToolRun got = run({file, "--mode", "skia", "-o", path("x.png")});
+        EXPECT_EQ(got.status, 0);
+        EXPECT_EQ(got.err, "pelm-decode: " + file + ": warning: the palette behind a " + one.header_size +
+                               "-byte header is read from the wrong place\n");
+        EXPECT_EQ(read_png(path("x.png")).width, expected.width);
+        EXPECT_NE(difference(expected, read_png(path("x.png"))), "") << one.name;
+
+        const std::string plain = write("plain.bmp", with_plain_header(read_file(file)));
+        for (const std::string source : {"memory", "file", "pipe"}) {
+            EXPECT_EQ(run({plain, "--mode", "skia", "--source", source, "-o", path("x.png")}).err, "") << one.name;
+            EXPECT_EQ(difference(expected, read_png(path("x.png"))), "") << one.name << ", " << source;
+        }
     }
 }
 

@@ -252,13 +252,5 @@ TEST_F(ToolPng, block_by_block_gives_up_where_the_first_block_brings_no_row) {
     }
 }
 
-TEST_F(ToolPng, modes_are_for_png_so_far) {
-    const std::string bmp = sample("sunset.bmp").string();
-    for (const char *const mode : {"iter", "line=3"}) {
-        expect_failure({bmp, "--mode", mode, "-o", path("x.png")}, bmp, "the BMP decoder has only --mode oneshot");
-    }
-    EXPECT_EQ(run({bmp, "--mode", "oneshot", "-o", path("x.png")}).status, 0);
-}
-
 } // namespace
 } // namespace pelm::test

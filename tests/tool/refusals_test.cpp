@@ -34,7 +34,8 @@ TEST_F(ToolRefusals, header_sizes) {
     for (const uint32_t size : {0u, 16u, 52u, 108u, 124u, 380u}) {
         BmpFile file = plain();
         file.header_size = size;
-        expect_refused(file, "BMP header of " + std::to_string(size) + " bytes is not supported");
+        const std::string hint = size >= 40 ? "; use --mode skia" : "";
+        expect_refused(file, "BMP header of " + std::to_string(size) + " bytes is not supported" + hint);
     }
 }
 
@@ -44,8 +45,8 @@ TEST_F(ToolRefusals, compressions) {
         uint16_t bits;
         const char *reason;
     } cases[] = {
-        {1, 8, "RLE8 compression is not supported"},
-        {2, 4, "RLE4 compression is not supported"},
+        {1, 8, "RLE8 compression is not supported; use --mode skia"},
+        {2, 4, "RLE4 compression is not supported; use --mode skia"},
         {4, 24, "JPEG compression is not supported"},
         {5, 24, "PNG compression is not supported"},
         {3, 32, "bit fields at 32 bits per pixel are not supported"},

@@ -75,9 +75,9 @@ TEST_F(ToolSamples, look_the_same_in_every_output_format) {
 
 TEST_F(ToolSamples, give_the_same_pixels_from_every_source) {
     for (const auto &file : bmp_samples()) {
-        if (file.stem() == "sunset-topdown") continue;
         const Image expected = stored_image(read_file(file));
         for (const char *const source : {"memory", "file", "pipe"}) {
+            if (file.stem() == "sunset-topdown" && source == std::string("pipe")) continue;
             EXPECT_EQ(difference(expected, decoded({file.string(), "--source", source})), "") << file << source;
         }
         EXPECT_EQ(difference(expected, decoded({"-"}, file.string())), "") << file;
@@ -104,12 +104,13 @@ TEST_F(ToolSamples, are_turned_clockwise) {
     }
 }
 
-TEST_F(ToolSamples, that_are_top_down_come_with_a_warning_from_a_pipe) {
-    const ToolRun got = run({"-", "-o", path("x.png")}, sample("sunset-topdown.bmp").string());
+TEST_F(ToolSamples, that_are_top_down_come_with_a_warning_from_a_pipe_that_was_asked_for) {
+    const std::string input = sample("sunset-topdown.bmp").string();
+    const ToolRun got = run({"-", "--source", "pipe", "-o", path("x.png")}, input);
     EXPECT_EQ(got.status, 0);
     EXPECT_EQ(got.err, "pelm-decode: standard input: warning: from a pipe the rows of a top-down file are written "
                        "upwards; use --source memory\n");
-    EXPECT_EQ(run({"-", "--quiet", "-o", path("x.png")}, sample("sunset-topdown.bmp").string()).err, "");
+    EXPECT_EQ(run({"-", "--source", "pipe", "--quiet", "-o", path("x.png")}, input).err, "");
 }
 
 } // namespace
