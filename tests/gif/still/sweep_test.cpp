@@ -57,7 +57,6 @@ public:
         return setting;
     }
 
-
     uint32_t below(uint32_t limit) { return noise_.below(limit); }
 
 private:
