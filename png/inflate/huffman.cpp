@@ -25,8 +25,14 @@ struct Codes {
 void assign_codes(const uint8_t *code_lengths, uint32_t count, Codes &codes) {
     for (uint32_t &number : codes.of_length)
         number = 0;
-    for (uint32_t i = 0; i < count; ++i)
-        ++codes.of_length[code_lengths[i] & 15];
+    uint16_t used[largest_alphabet]; // small blocks use few symbols
+    uint32_t used_count = 0;
+    for (uint32_t symbol = 0; symbol < count; ++symbol) {
+        used[used_count] = static_cast<uint16_t>(symbol);
+        used_count += code_lengths[symbol] != 0 ? 1 : 0;
+    }
+    for (uint32_t i = 0; i < used_count; ++i)
+        ++codes.of_length[code_lengths[used[i]] & 15];
     codes.of_length[0] = 0;
     codes.first[0] = 0;
     codes.begin[1] = 0;
@@ -36,8 +42,8 @@ void assign_codes(const uint8_t *code_lengths, uint32_t count, Codes &codes) {
         next[bits] = codes.begin[bits];
         codes.begin[bits + 1] = codes.begin[bits] + codes.of_length[bits];
     }
-    for (uint32_t symbol = 0; symbol < count; ++symbol)
-        if (code_lengths[symbol] != 0) codes.symbols[next[code_lengths[symbol] & 15]++] = static_cast<uint16_t>(symbol);
+    for (uint32_t i = 0; i < used_count; ++i)
+        codes.symbols[next[code_lengths[used[i]] & 15]++] = used[i];
 }
 
 uint32_t new_node(HuffmanNodePool &pool) {
