@@ -115,7 +115,7 @@ Picture decode_cell(const std::string &name, const char *format, uint32_t turn, 
     // Formats without alpha show what is not covered as a background of the box's colour.
     if (!options.format->has_alpha)
         options.background = uint32_t{box_colour.r} << 16 | box_colour.g << 8 | box_colour.b;
-    return decode(input, image, describe(image, input), options, session).picture;
+    return decode(input, image, describe(image, input, options.mode), options, session).picture;
 }
 
 void draw_captions(Sheet &sheet) {
