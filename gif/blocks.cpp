@@ -1,4 +1,4 @@
-// The structure of a GIF file (GIF89a specification): header, logical screen, and the walk over blocks from one image
+// The structure of a GIF file (GIF89a): header, logical screen, and the walk over blocks from one image
 // to the next.
 #include "frame/bytes.h"
 #include "frame/host.h"

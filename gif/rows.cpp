@@ -16,7 +16,7 @@ struct Pass {
     int32_t next_start; // row of the image that the next pass begins with
 };
 
-// GIF89a specification, appendix E; the rows after the last pass do not exist.
+// GIF89a, appendix E; the rows after the last pass do not exist.
 constexpr Pass passes[] = {{8, 4}, {8, 2}, {4, 1}, {2, 0}};
 
 void advance_in_passes(GifDecoderState &state) {

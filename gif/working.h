@@ -34,7 +34,7 @@ PELM_EXPORT int32_t PELMI_CreateGIFDecoderInfo(GifDecoderState *state);
 // Frees the state and all that it owns. NULL is ignored.
 PELM_EXPORT void PELMI_DelGIFDecoderInfo(GifDecoderState *state);
 
-// --- LZW (GIF89a specification, appendix F) ---
+// --- LZW (GIF89a, appendix F) ---
 
 // 1; or 0 above 11, and nothing is written.
 PELM_EXPORT int32_t PELMI_InitializeTransTBL(uint32_t minCodeSize, GifLzwTables *tables);

@@ -1,4 +1,4 @@
-// The decoding loop (GIF89a specification, appendix F): from codes to rows of palette indices.
+// The decoding loop (GIF89a, appendix F): from codes to rows of palette indices.
 #pragma once
 
 #include "gif/lzw/code_reader.h"
