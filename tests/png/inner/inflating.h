@@ -1,6 +1,8 @@
 // The decompressor's core with rows that are no rows: bytes are collected, and the caller says when to stop.
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <ostream>
 
 #include "png/inflate/inflate.h"
@@ -139,6 +141,27 @@ inline Bytes joined(std::initializer_list<Bytes> parts) {
     for (const Bytes &part : parts)
         all.insert(all.end(), part.begin(), part.end());
     return all;
+}
+
+inline Bytes text_bytes(const std::string &text) {
+    return {text.begin(), text.end()};
+}
+
+inline void expect_inflates_to(const Bytes &stream, const Bytes &wanted, const Options &options = {}) {
+    const Outcome got = inflated(stream, options);
+    EXPECT_EQ(got.stop, Stop::finished);
+    EXPECT_TRUE(got.bytes == wanted) << got.bytes.size() << " bytes, expected " << wanted.size();
+    EXPECT_EQ(got.total, wanted.size());
+}
+
+inline void expect_fails(const Deflate &deflate, Stop wanted, const Bytes &bytes_before = {}) {
+    Bytes stream = zlib_stream(deflate);
+    stream.insert(stream.end(), 64, 0); // something to look ahead at
+    for (const ptrdiff_t piece : {0, 1, 2}) {
+        const Outcome got = inflated(stream, {.piece = piece});
+        EXPECT_EQ(got.stop, wanted) << "piece " << piece;
+        EXPECT_EQ(got.bytes, bytes_before) << "piece " << piece;
+    }
 }
 
 } // namespace pelm::test

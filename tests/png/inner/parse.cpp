@@ -51,4 +51,14 @@ Chunk unknown_chunk(size_t size) {
     return chunk;
 }
 
+void expect_result(const Bytes &file, uint32_t wanted, const std::string &what) {
+    for (const uint32_t kind : source_kinds)
+        EXPECT_EQ(parsed(file, kind), wanted) << what << ", kind " << kind;
+}
+
+std::vector<Chunk> with_chunk(std::vector<Chunk> chunks, size_t at, const Chunk &chunk) {
+    chunks.insert(chunks.begin() + static_cast<ptrdiff_t>(at), chunk);
+    return chunks;
+}
+
 } // namespace pelm::test

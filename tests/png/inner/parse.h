@@ -34,4 +34,10 @@ Png small_png(uint8_t colour_type, uint8_t depth);
 // A chunk of no meaning to anyone.
 Chunk unknown_chunk(size_t size);
 
+// Parses it from every kind of source.
+void expect_result(const Bytes &file, uint32_t wanted, const std::string &what);
+
+// The same chunks with another one put in at `at`.
+std::vector<Chunk> with_chunk(std::vector<Chunk> chunks, size_t at, const Chunk &chunk);
+
 } // namespace pelm::test

@@ -1,0 +1,191 @@
+// Blocks with codes of their own: incomplete, empty and over-subscribed ones, and how their lengths are sent.
+#include <gtest/gtest.h>
+
+#include "tests/png/inner/inflating.h"
+
+namespace pelm::test {
+
+TEST(Inflate, an_incomplete_code_serves_as_long_as_its_gaps_are_not_met) {
+    DynamicCodes codes;
+    codes.literal_lengths = Bytes(257);
+    codes.literal_lengths['a'] = 3;
+    codes.literal_lengths[256] = 9;
+    codes.distance_lengths = {0};
+    Deflate deflate;
+    deflate.dynamic(codes, literals(text_bytes("aaa")), Last::yes);
+    expect_inflates_to(zlib_stream(deflate), text_bytes("aaa"));
+}
+
+TEST(Inflate, an_empty_literal_code_is_bad_at_its_first_use) {
+    DynamicCodes codes;
+    codes.literal_lengths = Bytes(257);
+    codes.distance_lengths = {1};
+    Deflate deflate;
+    deflate.dynamic(codes, {}, Last::yes, EndOfBlock::left_out);
+    expect_fails(deflate, Stop::bad_code);
+}
+
+TEST(Inflate, an_empty_code_length_code_is_bad) {
+    DynamicCodes codes;
+    codes.code_length_lengths = Bytes(19);
+    codes.hlit = 0;
+    codes.hdist = 0;
+    codes.sequence = std::vector<LengthSymbol>();
+    Deflate deflate;
+    deflate.block_header(2, Last::yes);
+    deflate.dynamic_header(codes);
+    expect_fails(deflate, Stop::bad_code);
+}
+
+TEST(Inflate, a_block_without_distance_codes_may_hold_literals) {
+    DynamicCodes codes = codes_for(literals(text_bytes("text")));
+    codes.distance_lengths = {0};
+    Deflate deflate;
+    deflate.dynamic(codes, literals(text_bytes("text")), Last::yes);
+    expect_inflates_to(zlib_stream(deflate), text_bytes("text"));
+}
+
+TEST(Inflate, over_subscribed_codes_decode_as_their_tree_says) {
+    // Three codes of one bit: 0, 1, and 0 once more, which the last one keeps.
+    DynamicCodes codes;
+    codes.literal_lengths = Bytes(257);
+    codes.literal_lengths['a'] = codes.literal_lengths['b'] = codes.literal_lengths[256] = 1;
+    codes.distance_lengths = {0};
+    Deflate deflate;
+    deflate.dynamic(codes, {literal('b'), literal('b'), literal('a')}, Last::yes, EndOfBlock::left_out);
+    expect_inflates_to(zlib_stream(deflate), text_bytes("bb"));
+}
+
+namespace {
+
+// 257 + 1 lengths in which 'a' and the end have codes of one bit, sent in runs.
+DynamicCodes run_codes(const std::vector<LengthSymbol> &sequence, size_t distance_count = 1) {
+    DynamicCodes codes;
+    codes.literal_lengths = Bytes(257);
+    codes.literal_lengths['a'] = codes.literal_lengths[256] = 1;
+    codes.distance_lengths = Bytes(distance_count);
+    codes.code_length_lengths = Bytes{3, 3, 3, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 3, 3, 3};
+    codes.sequence = sequence;
+    return codes;
+}
+
+const LengthSymbol zeros_97a = {18, 97 - 11}; // in front of 'a'
+const LengthSymbol zeros_138 = {18, 127};
+const LengthSymbol zeros_20 = {18, 9};
+
+} // namespace
+
+TEST(Inflate, runs_of_code_lengths) {
+    // 97 zeros, 'a', 138 + 20 zeros, end, one distance
+    Deflate deflate;
+    deflate.dynamic(run_codes({zeros_97a, {1, 0}, zeros_138, zeros_20, {1, 0}, {0, 0}}), literals({'a', 'a'}),
+                    Last::yes);
+    expect_inflates_to(zlib_stream(deflate), {'a', 'a'});
+}
+
+TEST(Inflate, a_run_may_go_on_from_literal_into_distance_lengths_and_end_exactly_with_them) {
+    // behind the end of block: five more ones for distances 0 to 4 would be over-subscribed but legal; here 16 repeats
+    // the 1 of the end for three of four distances, and 17 ends with the last of seven
+    DynamicCodes codes = run_codes({zeros_97a, {1, 0}, zeros_138, zeros_20, {1, 0}, {16, 0}, {17, 1}}, 7);
+    codes.distance_lengths = {1, 1, 1, 0, 0, 0, 0};
+    Deflate deflate;
+    deflate.dynamic(codes, literals({'a'}), Last::yes);
+    expect_inflates_to(zlib_stream(deflate), {'a'});
+
+    DynamicCodes zeros = run_codes({zeros_97a, {1, 0}, zeros_138, zeros_20, {1, 0}, {18, 0}}, 11);
+    Deflate with_zeros;
+    with_zeros.dynamic(zeros, literals({'a'}), Last::yes);
+    expect_inflates_to(zlib_stream(with_zeros), {'a'});
+}
+
+TEST(Inflate, a_run_beyond_the_last_length_is_bad) {
+    struct Case {
+        LengthSymbol run;
+        size_t distances; // one fewer than the run is long
+    };
+    for (const Case &one :
+         {Case{{16, 0}, 2}, {{16, 3}, 5}, {{17, 0}, 2}, {{17, 7}, 9}, {{18, 0}, 10}, {{18, 20}, 30}, {{18, 127}, 30}}) {
+        Deflate deflate;
+        deflate.block_header(2, Last::yes);
+        deflate.dynamic_header(run_codes({zeros_97a, {1, 0}, zeros_138, zeros_20, {1, 0}, one.run}, one.distances));
+        expect_fails(deflate, Stop::bad_stream);
+    }
+}
+
+TEST(Inflate, a_repetition_before_any_length_is_bad) {
+    Deflate deflate;
+    deflate.block_header(2, Last::yes);
+    deflate.dynamic_header(run_codes({{16, 0}}));
+    expect_fails(deflate, Stop::bad_stream);
+}
+
+TEST(Inflate, a_repetition_repeats_zeros_of_a_run_too) {
+    // 94 zeros, 3 zeros by repetition, 'a', ...
+    Deflate deflate;
+    deflate.dynamic(run_codes({{18, 94 - 11}, {16, 0}, {1, 0}, zeros_138, zeros_20, {1, 0}, {0, 0}}), literals({'a'}),
+                    Last::yes);
+    expect_inflates_to(zlib_stream(deflate), {'a'});
+}
+
+TEST(Inflate, a_distance_count_of_32_means_no_distance_lengths_at_all) {
+    DynamicCodes codes = codes_for(literals(text_bytes("no distances")));
+    codes.distance_lengths = {};
+    codes.hdist = 31;
+    Deflate deflate;
+    deflate.dynamic(codes, literals(text_bytes("no distances")), Last::yes);
+    expect_inflates_to(zlib_stream(deflate), text_bytes("no distances"));
+    // and so a match has no distance to go on with
+    DynamicCodes with_length = codes_for({literal('a'), symbol(257)});
+    with_length.distance_lengths = {};
+    with_length.hdist = 31;
+    Deflate match_without_distance;
+    match_without_distance.dynamic(with_length, {literal('a'), symbol(257)}, Last::yes);
+    expect_fails(match_without_distance, Stop::bad_code, {'a'});
+    // and a run that goes beyond the 257 others by one is too long
+    DynamicCodes run = run_codes({zeros_97a, {1, 0}, zeros_138, {18, 22 - 11}}, 1);
+    run.hdist = 31;
+    Deflate too_long;
+    too_long.block_header(2, Last::yes);
+    too_long.dynamic_header(run);
+    expect_fails(too_long, Stop::bad_stream);
+}
+
+TEST(Inflate, most_lengths_288_and_31) {
+    Tokens tokens = {literal('a'), literal('b'), match(258, 2), match(11, 1)};
+    DynamicCodes codes = codes_for(tokens);
+    codes.literal_lengths.resize(288);
+    codes.distance_lengths.resize(31);
+    Deflate deflate;
+    deflate.dynamic(codes, tokens, Last::yes);
+    expect_inflates_to(zlib_stream(deflate), expand(tokens));
+}
+
+TEST(Inflate, fewer_code_length_codes_leave_the_others_without_a_code) {
+    // Four: 16, 17, 18 and 0. A block of nothing but zeros has no code for its end.
+    DynamicCodes codes;
+    codes.literal_lengths = Bytes(257);
+    codes.distance_lengths = Bytes(1);
+    codes.code_length_lengths = Bytes{1, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 1};
+    codes.hclen = 0;
+    codes.sequence = {{zeros_138, {18, 258 - 138 - 11}}};
+    Deflate deflate;
+    deflate.dynamic(codes, {}, Last::yes, EndOfBlock::left_out);
+    expect_fails(deflate, Stop::bad_code);
+}
+
+TEST(Inflate, blocks_of_their_own_codes_follow_each_other) {
+    Deflate deflate;
+    Bytes wanted;
+    for (uint32_t i = 0; i < 40; ++i) {
+        const Tokens tokens = {literal(i), literal(i * 5), literal(i * 11), match(3 + i, 1 + i % 3)};
+        if (i % 3 == 0)
+            deflate.fixed(tokens, i == 39 ? Last::yes : Last::no);
+        else
+            deflate.dynamic(tokens, i == 39 ? Last::yes : Last::no);
+        wanted = joined({wanted, expand(tokens, wanted)});
+    }
+    expect_inflates_to(zlib_stream(deflate), wanted);
+    expect_inflates_to(zlib_stream(deflate), wanted, {.piece = 1, .stop_after = 1, .pause_at_blocks = true});
+}
+
+} // namespace pelm::test
