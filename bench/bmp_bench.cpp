@@ -7,6 +7,7 @@
 
 #include "PelmHost.h"
 #include "bench/bmp_pictures.h"
+#include "bench/output.h"
 #include "bench/stb_peer.h"
 
 namespace bench {
@@ -15,32 +16,12 @@ namespace {
 constexpr int32_t width = 4000;
 constexpr int32_t height = 3000;
 
-struct Box {
-    int32_t width, height;
-};
-
-struct Format {
-    const char *name;
-    uint32_t code;
-    int32_t pixel_bytes;
-};
-
-constexpr Format rgba = {"rgba", PELM_FORMAT_RGBA8888, 4};
-constexpr Format rgb565 = {"rgb565", PELM_FORMAT_RGB565, 2};
-
 // Each file is made when its first benchmark runs, and kept.
 const std::vector<uint8_t> &file_of_depth(int32_t bits_per_pixel) {
     static std::vector<uint8_t> files[33];
     std::vector<uint8_t> &file = files[bits_per_pixel];
     if (file.empty()) file = photo_bmp(width, height, bits_per_pixel);
     return file;
-}
-
-std::vector<uint8_t> &output_for(const Format &format, Box box) {
-    static std::vector<uint8_t> output;
-    output.resize(static_cast<size_t>(box.width) * static_cast<size_t>(box.height) *
-                  static_cast<size_t>(format.pixel_bytes));
-    return output;
 }
 
 void decode(benchmark::State &state, int32_t bits_per_pixel, Format format, Box box, uint32_t flags) {

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "PelmHost.h"
+#include "bench/output.h"
 
 namespace bench {
 namespace {
@@ -14,18 +15,7 @@ namespace {
 constexpr int32_t width = 4000;
 constexpr int32_t height = 3000;
 
-struct Box {
-    int32_t width, height;
-};
-
-struct Format {
-    const char *name;
-    uint32_t code;
-    size_t pixel_bytes;
-};
-
-constexpr Format formats[] = {
-    {"rgba", PELM_FORMAT_RGBA8888, 4}, {"rgb", PELM_FORMAT_RGB888, 3}, {"rgb565", PELM_FORMAT_RGB565, 2}};
+constexpr Format formats[] = {rgba, rgb, rgb565};
 
 // A page: white with dithered patches, and runs of black.
 const std::vector<uint8_t> &page() {
@@ -39,12 +29,6 @@ const std::vector<uint8_t> &page() {
         file.push_back(patch == 0 ? static_cast<uint8_t>(noise >> 24) : patch == 1 ? uint8_t{0} : uint8_t{0xFF});
     }
     return file;
-}
-
-std::vector<uint8_t> &output_for(const Format &format, Box box) {
-    static std::vector<uint8_t> output;
-    output.resize(static_cast<size_t>(box.width) * static_cast<size_t>(box.height) * format.pixel_bytes);
-    return output;
 }
 
 void decode(benchmark::State &state, Format format, Box box) {

@@ -1,0 +1,33 @@
+// What the benchmarks decode to: a box, and pixels of a format.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <vector>
+
+#include "PelmImageDecoder.h"
+
+namespace bench {
+
+struct Box {
+    int32_t width, height;
+};
+
+struct Format {
+    const char *name;
+    uint32_t code;
+    size_t pixel_bytes;
+};
+
+inline constexpr Format rgba = {"rgba", PELM_FORMAT_RGBA8888, 4};
+inline constexpr Format rgb = {"rgb", PELM_FORMAT_RGB888, 3};
+inline constexpr Format rgb565 = {"rgb565", PELM_FORMAT_RGB565, 2};
+
+// One buffer for all, so that none finds it cold.
+inline std::vector<uint8_t> &output_for(const Format &format, Box box) {
+    static std::vector<uint8_t> output;
+    output.resize(static_cast<size_t>(box.width) * static_cast<size_t>(box.height) * format.pixel_bytes);
+    return output;
+}
+
+} // namespace bench
