@@ -6,11 +6,11 @@
 namespace pelm::fuzz {
 namespace {
 
-constexpr uint64_t everything = UINT64_MAX;
 constexpr uint64_t most_for_a_still_gif = 464u << 10;
 
-bool is_bmp_header_refused(const Plan &plan) {
-    if (plan.file.size() <= 14) return false;
+constexpr size_t bmp_header_bytes = 54;
+
+bool is_bmp_header_unsupported(const Plan &plan) {
     const uint8_t size = plan.file[14];
     return size != 12 && size != 40 && (size < 56 || size > 64);
 }
@@ -44,57 +44,93 @@ Account::~Account() {
     PelmTest_Reset();
 }
 
-// Reading must end, whatever the file says: at most a few times all of it in one call.
 void Account::observe(void *account, const PelmTestCall *call) {
-    Account &self = *static_cast<Account *>(account);
     if (call->served == 0) return;
     if (call->violation != nullptr) give_reason(call->violation);
-    if (call->service != PELM_TEST_READ) return;
-    const uint64_t file = self.plan_.file.size();
-    self.came_short_ |= call->result < call->amount;
-    self.bytes_read_ += call->result > 0 ? static_cast<uint64_t>(call->result) : 0;
-    if (++self.reads_ > 2000 + 8 * file) give_reason("reads without end");
-    if (self.bytes_read_ > (1u << 20) + 8 * file) give_reason("reads the file again and again");
+    if (call->service == PELM_TEST_READ || call->service == PELM_TEST_ALLOCATION)
+        static_cast<Account *>(account)->note(*call);
 }
 
-void Account::begin_call() {
-    const PelmTestCounters &now = *PelmTest_Counters();
-    live_before_ = now.liveBlocks;
-    stops_before_ = now.stops;
-    failed_before_ = now.failedAllocations;
-    reads_ = bytes_read_ = 0;
-    came_short_ = false;
+// Reading must end, whatever the file says: at most a few times all of it in one call.
+void Account::note(const PelmTestCall &call) {
+    const bool is_read = call.service == PELM_TEST_READ;
+    const int32_t delivered = is_read ? call.result : call.block != nullptr ? 1 : 0;
+    if (plan_.keeps_services) {
+        const bool at_end = is_read && call.position >= static_cast<int64_t>(plan_.file.size());
+        services_.push_back({calls_, is_read, static_cast<int32_t>(call.amount), delivered, at_end});
+    }
+    if (!is_read) {
+        if (delivered == 0) (allocated_ == 0 ? has_no_first_ : has_no_second_) = true;
+        allocated_ += static_cast<uint64_t>(delivered);
+        bytes_allocated_ += delivered != 0 ? static_cast<uint64_t>(call.amount) : 0;
+        return;
+    }
+    const uint64_t file = plan_.file.size();
+    came_short_ = call.result < call.amount;
+    bytes_read_ += call.result > 0 ? static_cast<uint64_t>(call.result) : 0;
+    if (++reads_ > 2000 + 8 * file) give_reason("reads without end");
+    if (bytes_read_ > (1u << 20) + 8 * file) give_reason("reads the file again and again");
 }
 
-uint64_t Account::stated_leak(const Call &call, const Ending &ending) const {
+void Account::begin_call(bool was_idle) {
+    before_ = *PelmTest_Counters();
+    was_idle_ = was_idle;
+    allocated_ = bytes_allocated_ = reads_ = bytes_read_ = 0;
+    has_no_first_ = has_no_second_ = came_short_ = false;
+}
+
+// A refusal that leaves what was allocated by then: a header of another size, or a read that came short.
+bool Account::is_refused_bmp() const {
+    if (PelmTest_Counters()->failedAllocations != before_.failedAllocations) return false;
+    const bool has_header = plan_.file.size() >= bmp_header_bytes && begins_with_bm(plan_);
+    return came_short_ || (has_header && is_bmp_header_unsupported(plan_));
+}
+
+// In blocks: what a call leaves for good, as the header says.
+uint64_t Account::stated_leak(const Call &call, const Ending &ending, uint64_t freed) const {
     const bool failed = ending.result == PELM_RESULT_FAILED;
+    const uint64_t held = before_.liveBlocks - lost_;
     switch (call.leaks) {
     case Leaks::nothing: return 0;
-    case Leaks::broken_gif: return failed && !ending.found_an_image ? everything : 0;
+    case Leaks::broken_gif:
+        return failed && ending.told_the_size && !ending.found_an_image ? allocated_ - freed : 0;
     case Leaks::read_buffer:
-        return plan_.kind == PELM_SOURCE_STREAM_ALT || plan_.kind == PELM_SOURCE_SEQUENTIAL ||
-                       PelmTest_Counters()->failedAllocations != failed_before_
-                   ? 1
-                   : 0;
-    case Leaks::refused_bmp:
-        if (!failed) return 0;
-        return came_short_ ? 2 : is_bmp_header_refused(plan_) ? 1 : 0;
-    case Leaks::unsigned_bmp: return failed && (came_short_ || !begins_with_bm(plan_)) ? 1 : 0;
-    case Leaks::all: return everything;
+        if (plan_.kind == PELM_SOURCE_MEMORY || allocated_ == 0) return 0;
+        return plan_.kind != PELM_SOURCE_STREAM || (allocated_ == 1 && has_no_second_) ? 1 : 0;
+    case Leaks::refused_bmp: return failed && was_idle_ && is_refused_bmp() ? allocated_ : 0;
+    case Leaks::unsigned_bmp: return failed && (bytes_read_ < 2 || !begins_with_bm(plan_)) ? allocated_ : 0;
+    case Leaks::all: return held;
+    case Leaks::all_but_palette:
+        check(call, freed <= 2 && (freed > 0) == (held > 0), "freed more than the record and its palette");
+        return held - freed;
     }
     return 0;
 }
 
-void Account::end_call(const Call &call, const Ending &ending) {
+// What a call costs is bounded by what it reads, allocates and writes; compressed rows take two bytes each.
+void Account::look_at_work(const Call &call, uint64_t pixels) const {
     const PelmTestCounters &now = *PelmTest_Counters();
-    check(call, plan_.format != Format::png || now.stops == stops_before_ || ending.result == PELM_RESULT_FAILED,
+    const uint64_t file = plan_.file.size();
+    check(call, now.polls - before_.polls <= 2000 + 1100 * file, "polls without end");
+    const uint64_t moved = now.bytesMoved - before_.bytesMoved;
+    const uint64_t most = (1u << 16) + 16 * (before_.liveBytes + bytes_allocated_ + 4 * pixels + 4 * file) +
+                          reads_ * 16384;
+    check(call, moved <= most, "copies and fills without end");
+}
+
+void Account::end_call(const Call &call, const Ending &ending, uint64_t pixels) {
+    const PelmTestCounters &now = *PelmTest_Counters();
+    check(call, plan_.format != Format::png || now.stops == before_.stops || ending.result == PELM_RESULT_FAILED,
           "went on although it was told to stop");
-    const bool is_by_itself = call.progress == Progress::whole || call.progress == Progress::needs_idle;
-    const uint64_t owned = is_by_itself ? live_before_ : lost_;
+    look_at_work(call, pixels);
+    ++calls_;
+    const bool is_by_itself = call.progress == Progress::apart || call.progress == Progress::whole ||
+                              call.progress == Progress::needs_idle;
+    const uint64_t owned = is_by_itself ? before_.liveBlocks : lost_;
     if (!is_by_itself && !ending.idle) return;
     check(call, now.liveBlocks >= owned, "freed what it had lost");
     const uint64_t leaked = now.liveBlocks - owned;
-    check(call, leaked <= stated_leak(call, ending), "leaks");
+    check(call, leaked == stated_leak(call, ending, now.frees - before_.frees), "leaks other than the header states");
     lost_ += leaked;
 }
 

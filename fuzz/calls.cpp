@@ -37,47 +37,82 @@ int32_t pre_init(ImageDecodeInfo *info, void *, const Step &step) {
     return ZOTARPELMI_PreInitBMP(info, step.rows);
 }
 
+// Words of the request, told again.
+int32_t ask_for_words(ImageDecodeInfo *info, void *, const Step &) {
+    const ImageDecodeInfo words = info != nullptr ? *info : ImageDecodeInfo{};
+    const bool right = ZOTARPELMI_GetAGIFDelayTime(info) == words.frameDelay &&
+                       ZOTARPELMI_GetAGIFColorTableState(info) == words.colorTableState &&
+                       ZOTARPELMI_GetAGIFGlobalColorTable(info) == words.globalColorTable &&
+                       ZOTARPELMI_GetAGIFLocalColorTable(info) == words.localColorTable;
+    return info != nullptr && right ? 1 : info == nullptr && right ? 0 : -1;
+}
+
+int32_t make_transparency_record(ImageDecodeInfo *, void *, const Step &step) {
+    PngTrInfo *const record = step.null_request ? nullptr : PELMI_FastImgCreatePngTrInfo();
+    if (record == nullptr) return 0;
+    if (step.rows % 2 != 0) {
+        record->block = ZOTARPELM_OsMalloc(16);
+        record->ownsBlock = 1;
+    }
+    return PELMI_FastImgDestroyPngTrInfo(record);
+}
+
 constexpr Call bmp_calls[] = {
-    {"DecodeBMP", in_box<ZOTARPELMI_DecodeBMP>, Output::box, Progress::needs_idle, Leaks::refused_bmp, failed | done},
-    {"DecodeBMPIter", in_box<ZOTARPELMI_DecodeBMPIter>, Output::kept, Progress::steps, Leaks::refused_bmp,
-     failed | done | more},
-    {"DecodeBMPIterLine", by_rows<ZOTARPELMI_DecodeBMPIterLine>, Output::kept, Progress::steps, Leaks::refused_bmp,
+    {"DecodeBMP", in_box<ZOTARPELMI_DecodeBMP>, Output::box, Progress::needs_idle, State::none, Leaks::refused_bmp, 0,
      failed | done},
-    {"DecodeBMPLine", by_rows<ZOTARPELMI_DecodeBMPLine>, Output::own_rows, Progress::steps, Leaks::refused_bmp,
-     failed | done | data_ended},
-    {"PreInitBMP", pre_init, Output::none, Progress::parks, Leaks::unsigned_bmp, failed | done},
-    {"DecodeBMPSKIA", in_box<ZOTARPELMI_DecodeBMPSKIA>, Output::box, Progress::resumes, Leaks::nothing, failed | done},
-    {"AbortBMPIter", ending<ZOTARPELMI_AbortBMPIter>, Output::none, Progress::gives_up, Leaks::all, failed | done},
-    {"DestroyBMP", ending<PELMI_BMP_DestroyBMP>, Output::none, Progress::gives_up_any, Leaks::all, failed | done},
+    {"DecodeBMPIter", in_box<ZOTARPELMI_DecodeBMPIter>, Output::kept, Progress::steps, State::bmp_bands,
+     Leaks::refused_bmp, failed | more, done, 100},
+    {"DecodeBMPIterLine", by_rows<ZOTARPELMI_DecodeBMPIterLine>, Output::kept, Progress::steps, State::bmp_bands,
+     Leaks::refused_bmp, failed | done, done},
+    {"DecodeBMPLine", by_rows<ZOTARPELMI_DecodeBMPLine>, Output::own_rows, Progress::steps, State::bmp_bands,
+     Leaks::refused_bmp, done | data_ended, failed | done | data_ended},
+    {"PreInitBMP", pre_init, Output::none, Progress::parks, State::bmp_parked, Leaks::unsigned_bmp, done, failed},
+    {"DecodeBMPSKIA", in_box<ZOTARPELMI_DecodeBMPSKIA>, Output::box, Progress::resumes, State::bmp_parked,
+     Leaks::nothing, 0, failed | done},
+    {"AbortBMPIter", ending<ZOTARPELMI_AbortBMPIter>, Output::none, Progress::gives_up, State::none, Leaks::all, 0,
+     failed | done},
+    {"DestroyBMP", ending<PELMI_BMP_DestroyBMP>, Output::none, Progress::gives_up_any, State::none,
+     Leaks::all_but_palette, 0, failed | done},
 };
 
 constexpr Call wbmp_calls[] = {
-    {"DecodeWBMP", in_box<ZOTARPELMI_DecodeWBMP>, Output::box, Progress::whole, Leaks::nothing, failed | done},
+    {"DecodeWBMP", in_box<ZOTARPELMI_DecodeWBMP>, Output::box, Progress::whole, State::none, Leaks::nothing, 0,
+     failed | done},
 };
 
 constexpr Call png_calls[] = {
-    {"DecodePNG", in_box<ZOTARPELMI_DecodePNG>, Output::box, Progress::steps, Leaks::nothing, failed | done},
-    {"DecodePNGIter", in_box<ZOTARPELMI_DecodePNGIter>, Output::box, Progress::steps, Leaks::nothing,
-     failed | done | more},
-    {"DecodePNGLine", by_rows<ZOTARPELMI_DecodePNGLine>, Output::box, Progress::steps, Leaks::nothing,
-     failed | done | more},
-    {"DestroyPNGInfo", ending<ZOTARPELMI_DestroyPNGInfo>, Output::none, Progress::gives_up, Leaks::nothing,
+    {"DecodePNG", in_box<ZOTARPELMI_DecodePNG>, Output::box, Progress::steps, State::png, Leaks::nothing, 0,
      failed | done},
-    {"AbortPNGIter", ending<ZOTARPELMI_AbortPNGIter>, Output::none, Progress::gives_up, Leaks::nothing, failed | done},
-    {"GetAlphaTrFlag", ask_for_alpha, Output::none, Progress::whole, Leaks::read_buffer, failed | done},
+    {"DecodePNGIter", in_box<ZOTARPELMI_DecodePNGIter>, Output::box, Progress::steps, State::png, Leaks::nothing, more,
+     failed | done},
+    {"DecodePNGLine", by_rows<ZOTARPELMI_DecodePNGLine>, Output::box, Progress::steps, State::png, Leaks::nothing,
+     more, failed | done},
+    {"DestroyPNGInfo", ending<ZOTARPELMI_DestroyPNGInfo>, Output::none, Progress::gives_up, State::none,
+     Leaks::nothing, 0, failed | done},
+    {"AbortPNGIter", ending<ZOTARPELMI_AbortPNGIter>, Output::none, Progress::gives_up, State::none, Leaks::nothing, 0,
+     failed | done},
+    {"GetAlphaTrFlag", ask_for_alpha, Output::none, Progress::apart, State::none, Leaks::read_buffer, 0, failed | done},
+    {"CreatePngTrInfo", make_transparency_record, Output::none, Progress::apart, State::none, Leaks::nothing, 0,
+     failed | done},
 };
 
 constexpr Call gif_calls[] = {
-    {"DecodeGIF", in_box<ZOTARPELMI_DecodeGIF>, Output::box, Progress::whole, Leaks::broken_gif, failed | done},
-    {"DecodeGIFIter", in_box<ZOTARPELMI_DecodeGIFIter>, Output::kept, Progress::steps, Leaks::broken_gif,
-     failed | done | more},
-    {"DecodeGIFLine", by_rows<ZOTARPELMI_DecodeGIFLine>, Output::rows, Progress::steps, Leaks::nothing, failed | done},
-    {"DecodeAGIF", in_box<ZOTARPELMI_DecodeAGIF>, Output::kept, Progress::steps, Leaks::nothing,
-     failed | done | last_frame},
-    {"DecodeAGIFIter", in_box<ZOTARPELMI_DecodeAGIFIter>, Output::kept, Progress::steps, Leaks::nothing,
-     failed | done | more | last_frame},
-    {"AbortGIFIter", ending<ZOTARPELMI_AbortGIFIter>, Output::none, Progress::gives_up, Leaks::nothing, failed | done},
-    {"AborAGIF", ending<ZOTARPELMI_AborAGIF>, Output::none, Progress::gives_up, Leaks::nothing, failed | done},
+    {"DecodeGIF", in_box<ZOTARPELMI_DecodeGIF>, Output::box, Progress::whole, State::none, Leaks::broken_gif, 0,
+     failed | done},
+    {"DecodeGIFIter", in_box<ZOTARPELMI_DecodeGIFIter>, Output::kept, Progress::steps, State::gif_slices,
+     Leaks::broken_gif, more, failed | done},
+    {"DecodeGIFLine", by_rows<ZOTARPELMI_DecodeGIFLine>, Output::rows, Progress::steps, State::gif_lines,
+     Leaks::nothing, done, failed | done},
+    {"DecodeAGIF", in_box<ZOTARPELMI_DecodeAGIF>, Output::kept, Progress::steps, State::frames, Leaks::nothing, done,
+     failed | last_frame},
+    {"DecodeAGIFIter", in_box<ZOTARPELMI_DecodeAGIFIter>, Output::kept, Progress::steps, State::frame_slices,
+     Leaks::nothing, done | more, failed | last_frame},
+    {"AbortGIFIter", ending<ZOTARPELMI_AbortGIFIter>, Output::none, Progress::gives_up, State::none, Leaks::nothing, 0,
+     failed | done},
+    {"AborAGIF", ending<ZOTARPELMI_AborAGIF>, Output::none, Progress::gives_up, State::none, Leaks::nothing, 0,
+     failed | done},
+    {"the words of animations", ask_for_words, Output::none, Progress::apart, State::none, Leaks::nothing, 0,
+     failed | done},
 };
 
 size_t bytes_in_gif_formats(uint32_t output_format) {

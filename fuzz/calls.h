@@ -19,6 +19,7 @@ enum class Output : uint8_t {
 
 // What a call does with the decode that is in progress.
 enum class Progress : uint8_t {
+    apart,       // decodes nothing
     whole,       // neither continues nor leaves one
     needs_idle,  // the same, but one in progress would be lost
     steps,       // begins one or goes on with it
@@ -28,13 +29,17 @@ enum class Progress : uint8_t {
     gives_up_any // ends one, also when it was parked
 };
 
+// What hangs from `decoderState`. Calls of the same state go on with each other's decodes; others refuse them.
+enum class State : uint8_t { none, bmp_bands, bmp_parked, png, gif_slices, gif_lines, frames, frame_slices };
+
 enum class Leaks : uint8_t {
     nothing,
-    broken_gif,   // all of the decode, when the file breaks off before its first image
-    read_buffer,  // of 16384 bytes, except for kind 0
-    refused_bmp,  // record and palette, for the refusals that leak
-    unsigned_bmp, // the record, when there is no BM
-    all           // of the decode that is given up, or all but its record and palette
+    broken_gif,     // all of the decode, when the file breaks off before its first image
+    read_buffer,    // of 16384 bytes, except for kind 0
+    refused_bmp,    // record and palette, for the refusals that leak
+    unsigned_bmp,   // the record, when there is no BM
+    all,            // of the decode that is given up
+    all_but_palette // the same, but its record and palette
 };
 
 struct Call {
@@ -42,8 +47,19 @@ struct Call {
     int32_t (*make)(ImageDecodeInfo *info, void *output, const Step &step);
     Output output;
     Progress progress;
+    State state; // that it leaves or goes on with
     Leaks leaks;
-    uint32_t results; // bit n: n may be answered
+    uint32_t keeps; // bit n: after the answer n the decode may be in progress
+    uint32_t ends;  // bit n: after the answer n it may be over, or none has begun
+    int32_t rows = 0; // per call; 0: the step's
+
+    bool may_answer(int32_t result) const { return has(keeps | ends, result); }
+    bool may_keep(int32_t result) const { return has(keeps, result); }
+    bool may_end(int32_t result) const { return has(ends, result); }
+
+    static bool has(uint32_t results, int32_t result) {
+        return result >= 0 && result < 32 && (results >> result & 1) != 0;
+    }
 };
 
 // All calls that a request of the format may be handed to: stills and animations of GIF share theirs.

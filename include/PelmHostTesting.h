@@ -65,6 +65,7 @@ typedef struct PelmTestCounters {
     uint64_t pauses; /* polls that were told to pause */
     uint64_t sleeps;
     uint64_t violations;
+    uint64_t bytesMoved; /* copied and filled by ZOTARPELM_OsMemcpy and ZOTARPELM_OsMemset */
 } PelmTestCounters;
 
 PELM_API const PelmTestCounters *PelmTest_Counters(void);

@@ -157,9 +157,11 @@ void ZOTARPELM_OsFree(void *payload) {
 }
 
 void ZOTARPELM_OsMemset(void *destination, int32_t value, uint32_t count) {
+    account().counters.bytesMoved += count;
     if (count > 0) memset(destination, value, count);
 }
 
 void ZOTARPELM_OsMemcpy(void *destination, const void *source, uint32_t count) {
+    account().counters.bytesMoved += count;
     if (count > 0) memmove(destination, source, count);
 }

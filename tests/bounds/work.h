@@ -9,7 +9,6 @@
 
 namespace pelm::test {
 
-// Copies and fills are counted too: the test program is linked so that calls of them arrive here.
 struct Work {
     uint64_t allocations = 0;
     uint64_t reads = 0;

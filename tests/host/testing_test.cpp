@@ -55,6 +55,12 @@ TEST_F(HostForTests, fills_blocks_as_asked) {
     EXPECT_EQ(std::vector<uint8_t>(block, block + 3), std::vector<uint8_t>(3, 0x42));
 }
 
+TEST_F(HostForTests, counts_the_bytes_that_are_copied_and_filled) {
+    ZOTARPELM_OsMemcpy(buffer, letters, 4);
+    ZOTARPELM_OsMemset(buffer, 0, 7);
+    EXPECT_EQ(counters.bytesMoved, 11u);
+}
+
 TEST_F(HostForTests, fails_the_allocations_it_is_told_to) {
     faults.failingAllocation = 2;
     faults.failingAllocationsFrom = 4;
