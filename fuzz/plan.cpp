@@ -84,7 +84,7 @@ Plan plan_from(const Head &head, Format format) {
         head.buffer_size < 0xC0 ? int32_t{head.buffer_size} * 16 : choose(buffer_sizes, head.buffer_size);
     plan.size_lie = static_cast<int8_t>(head.size_lie);
     plan.image_height = head.image_height;
-    plan.other_filling = (head.options & Options::other_filling) != 0;
+    plan.other_filling = plan.looks_at_pixels = (head.options & Options::other_filling) != 0;
     plan.own_colour_table = (head.options & Options::own_colour_table) != 0;
     plan.stated_end = (head.options & Options::stated_end) != 0;
     plan.no_data = (head.options & Options::no_data) != 0;

@@ -67,6 +67,9 @@ struct Plan {
     std::vector<Step> steps;
     uint32_t most_calls;
     std::vector<uint8_t> file;
+    bool looks_at_pixels = false; // what the buffers hold is part of the outcome
+    bool keeps_services = false;  // allocations and reads are told one by one
+    bool again = false;           // then the same request is decoded once more, without faults (not in exact buffers)
 };
 
 // One way to decode, to its end.

@@ -5,8 +5,6 @@
 #include <memory>
 #include <optional>
 
-#include "fuzz/account.h"
-#include "fuzz/calls.h"
 #include "fuzz/exact_bytes.h"
 
 namespace pelm::fuzz {
@@ -15,19 +13,6 @@ namespace {
 constexpr uint8_t background = 0x5C;
 constexpr uint32_t untouched = 0x5E5E5E5E;
 constexpr uint64_t largest_output = 1u << 20;
-
-struct Sides {
-    int32_t width, height;
-    bool operator==(const Sides &) const = default;
-};
-
-// What can be seen of a session.
-struct Outcome {
-    std::vector<int32_t> results;
-    std::vector<Sides> scaled; // after each call
-    uint64_t pixels = 0;       // hashed
-    bool operator==(const Outcome &) const = default;
-};
 
 uint64_t hash(uint64_t so_far, const uint8_t *bytes, size_t count) {
     for (size_t i = 0; i < count; ++i)
@@ -53,23 +38,30 @@ bool has_exact_buffers(const Plan &plan) {
     return knows_exact_buffers(plan.format) && (plan.flags & PELM_PLACE_MASK) == PELM_PLACE_EXACT;
 }
 
+uint64_t pixels_of(Sides sides) {
+    if (sides.width <= 0 || sides.height <= 0) return 0;
+    return static_cast<uint64_t>(sides.width) * static_cast<uint64_t>(sides.height);
+}
+
 class Session {
 public:
     // `measured`: an earlier session's outcome with the sizes of exact buffers. Without buffers it measures them.
     Session(const Plan &plan, int32_t filling, bool has_buffers, const Outcome *measured);
     Outcome run();
+    // The same request once more, without faults, into new buffers.
+    Outcome run_again();
+    const std::vector<Service> &services() const { return account_.services(); }
 
 private:
     void make(const Call &call, const Step &step);
     void carry_out_step(const Step &step);
-    bool is_legal(const Call &call) const;
     uint8_t *output_for(const Call &call, const Step &step);
     uint8_t *buffer(std::unique_ptr<ExactBytes> &holder, int64_t width, int64_t height, bool anew);
     uint8_t *box_buffer(std::unique_ptr<ExactBytes> &holder, const Step &step, bool anew);
     void look_at(const Call &call, const Step &step, int32_t result);
     void look_at_buffers();
     void bring_staging_buffer();
-    void follow_two_steps(const Call &call, const Step &step, int32_t result);
+    void end_two_steps(const Call &call, const Step &step, int32_t result);
     void free_colour_tables();
     void end();
 
@@ -78,6 +70,8 @@ private:
     const Outcome *const measured_;
     Outcome outcome_;
     Account account_;
+    RequestModel model_;
+    Sides scaled_{};
     ExactBytes file_;
     PelmTestBytes bytes_;
     InputSource source_{};
@@ -87,11 +81,10 @@ private:
     std::unique_ptr<ExactBytes> box_, kept_, rows_;
     std::vector<std::unique_ptr<ExactBytes>> outlived_; // a decode might still write there, wrongly
     int32_t begun_width_ = 0;
-    bool is_parked_ = false;
 };
 
 Session::Session(const Plan &plan, int32_t filling, bool has_buffers, const Outcome *measured)
-    : plan_(plan), has_buffers_(has_buffers), measured_(measured), account_(plan, filling),
+    : plan_(plan), has_buffers_(has_buffers), measured_(measured), account_(plan, filling), model_(plan),
       file_(held_bytes(plan)), bytes_{file_.bytes(), static_cast<int32_t>(file_.size()), plan.stated_end ? 1 : 0} {
     if (file_.size() > 0) memcpy(file_.bytes(), plan.file.data(), file_.size());
     PelmTest_OpenSource(&source_, plan.kind, &bytes_, plan.buffer_size);
@@ -128,34 +121,20 @@ Outcome Session::run() {
 void Session::carry_out_step(const Step &step) {
     const auto calls = calls_of(plan_.format);
     const Call &call = calls[step.call % calls.size()];
-    if (is_legal(call)) make(call, step);
-}
-
-// Only what the header allows: a decode must not be forgotten, and one that is parked is for two calls only.
-bool Session::is_legal(const Call &call) const {
-    const bool idle = info_.decoderState == nullptr;
-    switch (call.progress) {
-    case Progress::needs_idle:
-    case Progress::parks: return idle;
-    case Progress::resumes: return idle || is_parked_;
-    case Progress::gives_up_any: return true;
-    default: return !is_parked_;
-    }
+    if (model_.is_legal(call)) make(call, step);
 }
 
 void Session::make(const Call &call, const Step &step) {
-    const bool was_idle = info_.decoderState == nullptr;
-    if (was_idle) {
-        begun_width_ = step.width;
-    }
+    if (model_.is_idle()) begun_width_ = step.width;
     uint8_t *const output = output_for(call, step);
     info_.hasTransparency = untouched;
-    if (call.progress == Progress::resumes && is_parked_ && !step.null_request) bring_staging_buffer();
-    account_.begin_call();
+    info_.outputWidth = info_.outputHeight = static_cast<int32_t>(untouched);
+    if (model_.state() == State::bmp_parked && call.progress == Progress::resumes && !step.null_request)
+        bring_staging_buffer();
+    account_.begin_call(model_.is_idle());
     const int32_t result = call.make(step.null_request ? nullptr : &info_, output, step);
     outcome_.results.push_back(result);
-    outcome_.scaled.push_back({info_.outputWidth, info_.outputHeight});
-    follow_two_steps(call, step, result);
+    end_two_steps(call, step, result);
     look_at(call, step, result);
 }
 
@@ -165,17 +144,16 @@ void Session::bring_staging_buffer() {
 }
 
 // The record is gone after the second step whatever its result, and the staging buffer with it.
-void Session::follow_two_steps(const Call &call, const Step &step, int32_t result) {
+void Session::end_two_steps(const Call &call, const Step &step, int32_t result) {
     if (step.null_request) return;
-    if (call.progress == Progress::resumes && is_parked_) {
+    if (call.progress == Progress::resumes && model_.state() == State::bmp_parked) {
         check(call, result == PELM_RESULT_FAILED || info_.decoderState == nullptr, "kept its state");
         check(call, !is_staged(source_.kind) || source_.data == nullptr, "left the staging buffer in the source");
         info_.decoderState = nullptr;
     }
-    if (call.progress == Progress::parks && result == PELM_RESULT_DONE) is_parked_ = true;
-    if (info_.decoderState == nullptr) is_parked_ = false;
     // What is given up leaves its staging buffer behind, which must not be taken for the next one's.
-    if (call.leaks == Leaks::all && is_staged(source_.kind)) source_.data = nullptr;
+    if ((call.leaks == Leaks::all || call.leaks == Leaks::all_but_palette) && is_staged(source_.kind))
+        source_.data = nullptr;
 }
 
 uint8_t *Session::buffer(std::unique_ptr<ExactBytes> &holder, int64_t width, int64_t height, bool anew) {
@@ -214,18 +192,22 @@ uint8_t *Session::output_for(const Call &call, const Step &step) {
 
 void Session::look_at(const Call &call, const Step &step, int32_t result) {
     const bool idle = info_.decoderState == nullptr;
-    check(call, result >= 0 && result < 32 && (call.results >> result & 1) != 0, "gave a result that it has not");
-    check(call, !step.null_request || result == 0, "did something without a request");
+    const Sides words{info_.outputWidth, info_.outputHeight};
+    constexpr auto unwritten = static_cast<int32_t>(untouched);
+    const bool told_the_size = words != Sides{unwritten, unwritten};
+    if (told_the_size) scaled_ = words;
+    outcome_.scaled.push_back(scaled_);
+    const Left left{result, !idle, told_the_size ? std::optional(words) : std::nullopt};
+    if (const char *const wrong = model_.follow(call, step, left)) check(call, false, wrong);
     check(call,
           info_.reserved3 == untouched && info_.reserved4 == untouched && info_.reserved11 == untouched &&
               info_.reserved12 == untouched && info_.reserved13 == untouched && info_.reserved16 == untouched,
           "changed a reserved word");
-    if (plan_.format == Format::png && !step.null_request && call.output == Output::box)
-        check(call, idle == (result != PELM_RESULT_MORE), "kept or lost its state");
     if (plan_.format == Format::wbmp && plan_.kind == PELM_SOURCE_STREAM)
         check(call, source_.data == nullptr, "left its row buffer in the source");
     if (idle) free_colour_tables();
-    account_.end_call(call, {result, idle, info_.hasTransparency != untouched});
+    const Ending ending{result, idle, info_.hasTransparency != untouched, told_the_size};
+    account_.end_call(call, ending, pixels_of(scaled_));
     look_at_buffers();
 }
 
@@ -234,7 +216,10 @@ void Session::look_at_buffers() {
     for (const ExactBytes *const each : buffers) {
         if (each == nullptr) continue;
         if (!each->is_intact_before()) give_reason("a byte before the output was written");
-        if (plan_.other_filling) outcome_.pixels = hash(outcome_.pixels, each->bytes(), each->size());
+        if (!plan_.looks_at_pixels) continue;
+        outcome_.pixels = hash(outcome_.pixels, each->bytes(), each->size());
+        outcome_.wrote_anything |= std::any_of(each->bytes(), each->bytes() + each->size(),
+                                               [](uint8_t byte) { return byte != background; });
     }
 }
 
@@ -253,17 +238,37 @@ void Session::end() {
     account_.end();
 }
 
+Outcome Session::run_again() {
+    const int32_t filling = PelmTest_Faults()->filling;
+    *PelmTest_Faults() = PelmTestFaults{};
+    PelmTest_Faults()->filling = filling;
+    for (std::unique_ptr<ExactBytes> *const buffer : {&box_, &kept_, &rows_})
+        if (*buffer != nullptr) outlived_.push_back(std::move(*buffer));
+    outcome_ = {};
+    return run();
+}
+
 } // namespace
 
-void carry_out(const Plan &plan) {
+Report carry_out(const Plan &plan) {
     const bool exact = has_exact_buffers(plan);
     const int32_t filling = plan.faults.filling;
+    Report report;
     Outcome measured;
     if (exact) measured = Session(plan, filling, false, nullptr).run();
-    const Outcome outcome = Session(plan, filling, true, &measured).run();
-    if (exact && outcome.results != measured.results) give_reason("other results without a buffer");
-    if (plan.other_filling && outcome != Session(plan, filling ^ 0xFF, true, &measured).run())
+    Session session(plan, filling, true, &measured);
+    report.outcome = session.run();
+    report.calls = measured.results.size() + report.outcome.results.size();
+    if (exact && report.outcome.results != measured.results) give_reason("other results without a buffer");
+    if (plan.again) {
+        report.again = session.run_again();
+        report.calls += report.again.results.size();
+    }
+    report.services = session.services();
+    if (!plan.other_filling) return report;
+    if (report.outcome != Session(plan, filling ^ 0xFF, true, &measured).run())
         give_reason("what the host's memory held has been seen in the output");
+    return report;
 }
 
 } // namespace pelm::fuzz
