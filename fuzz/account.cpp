@@ -92,8 +92,7 @@ uint64_t Account::stated_leak(const Call &call, const Ending &ending, uint64_t f
     const uint64_t held = before_.liveBlocks - lost_;
     switch (call.leaks) {
     case Leaks::nothing: return 0;
-    case Leaks::broken_gif:
-        return failed && ending.told_the_size && !ending.found_an_image ? allocated_ - freed : 0;
+    case Leaks::broken_gif: return failed && ending.told_the_size && !ending.found_an_image ? allocated_ - freed : 0;
     case Leaks::read_buffer:
         if (plan_.kind == PELM_SOURCE_MEMORY || allocated_ == 0) return 0;
         return plan_.kind != PELM_SOURCE_STREAM || (allocated_ == 1 && has_no_second_) ? 1 : 0;
@@ -113,8 +112,8 @@ void Account::look_at_work(const Call &call, uint64_t pixels) const {
     const uint64_t file = plan_.file.size();
     check(call, now.polls - before_.polls <= 2000 + 1100 * file, "polls without end");
     const uint64_t moved = now.bytesMoved - before_.bytesMoved;
-    const uint64_t most = (1u << 16) + 16 * (before_.liveBytes + bytes_allocated_ + 4 * pixels + 4 * file) +
-                          reads_ * 16384;
+    const uint64_t most =
+        (1u << 16) + 16 * (before_.liveBytes + bytes_allocated_ + 4 * pixels + 4 * file) + reads_ * 16384;
     check(call, moved <= most, "copies and fills without end");
 }
 
@@ -124,8 +123,8 @@ void Account::end_call(const Call &call, const Ending &ending, uint64_t pixels) 
           "went on although it was told to stop");
     look_at_work(call, pixels);
     ++calls_;
-    const bool is_by_itself = call.progress == Progress::apart || call.progress == Progress::whole ||
-                              call.progress == Progress::needs_idle;
+    const bool is_by_itself =
+        call.progress == Progress::apart || call.progress == Progress::whole || call.progress == Progress::needs_idle;
     const uint64_t owned = is_by_itself ? before_.liveBlocks : lost_;
     if (!is_by_itself && !ending.idle) return;
     check(call, now.liveBlocks >= owned, "freed what it had lost");

@@ -62,7 +62,7 @@ private:
     // Of the call in progress.
     PelmTestCounters before_{};
     bool was_idle_ = true;
-    uint64_t allocated_ = 0, bytes_allocated_ = 0; // by successful allocations
+    uint64_t allocated_ = 0, bytes_allocated_ = 0;      // by successful allocations
     bool has_no_first_ = false, has_no_second_ = false; // of them: they failed
     uint64_t reads_ = 0, bytes_read_ = 0;
     bool came_short_ = false; // the last read

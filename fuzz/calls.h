@@ -49,8 +49,8 @@ struct Call {
     Progress progress;
     State state; // that it leaves or goes on with
     Leaks leaks;
-    uint32_t keeps; // bit n: after the answer n the decode may be in progress
-    uint32_t ends;  // bit n: after the answer n it may be over, or none has begun
+    uint32_t keeps;   // bit n: after the answer n the decode may be in progress
+    uint32_t ends;    // bit n: after the answer n it may be over, or none has begun
     int32_t rows = 0; // per call; 0: the step's
 
     bool may_answer(int32_t result) const { return has(keeps | ends, result); }

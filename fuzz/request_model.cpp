@@ -51,7 +51,8 @@ const char *RequestModel::look_at_size(const Call &call, const Step &step, const
         const bool may_lack = left.result == PELM_RESULT_FAILED || plan_.format == Format::wbmp;
         return may_lack ? nullptr : "did not tell the scaled size";
     }
-    const bool tells_late = plan_.format == Format::wbmp || (plan_.format == Format::bmp && call.output != Output::own_rows);
+    const bool tells_late =
+        plan_.format == Format::wbmp || (plan_.format == Format::bmp && call.output != Output::own_rows);
     if (left.result == PELM_RESULT_FAILED && tells_late) return "told a scaled size and failed";
     const bool is_proposal = call.progress == Progress::parks;
     return is_proposal || fits_box(call, step, *left.scaled) ? nullptr : "scaled beyond its box";

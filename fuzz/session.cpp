@@ -218,8 +218,8 @@ void Session::look_at_buffers() {
         if (!each->is_intact_before()) give_reason("a byte before the output was written");
         if (!plan_.looks_at_pixels) continue;
         outcome_.pixels = hash(outcome_.pixels, each->bytes(), each->size());
-        outcome_.wrote_anything |= std::any_of(each->bytes(), each->bytes() + each->size(),
-                                               [](uint8_t byte) { return byte != background; });
+        outcome_.wrote_anything |=
+            std::any_of(each->bytes(), each->bytes() + each->size(), [](uint8_t byte) { return byte != background; });
     }
 }
 

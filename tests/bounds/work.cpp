@@ -3,7 +3,8 @@
 namespace pelm::test {
 Work work() {
     const PelmTestCounters &counters = *PelmTest_Counters();
-    return {counters.allocations, counters.reads, counters.bytesRead, counters.seeks, counters.bytesMoved, counters.peakBytes};
+    return {counters.allocations, counters.reads,      counters.bytesRead,
+            counters.seeks,       counters.bytesMoved, counters.peakBytes};
 }
 
 void reset_work() {
