@@ -82,7 +82,8 @@ void Account::begin_call(bool was_idle) {
 // A refusal that leaves what was allocated by then: a header of another size, or a read that came short.
 bool Account::is_refused_bmp() const {
     if (PelmTest_Counters()->failedAllocations != before_.failedAllocations) return false;
-    const bool has_header = plan_.file.size() >= bmp_header_bytes && begins_with_bm(plan_);
+    const bool is_known_kind = plan_.kind <= PELM_SOURCE_STREAM_ALT || plan_.kind == PELM_SOURCE_SEQUENTIAL;
+    const bool has_header = is_known_kind && plan_.file.size() >= bmp_header_bytes && begins_with_bm(plan_);
     return came_short_ || (has_header && is_bmp_header_unsupported(plan_));
 }
 

@@ -32,15 +32,15 @@ bool writes_a_picture(const Decode &decode) {
 bool is_refused(const Decode &decode) {
     const std::string &input = decode.input->name;
     const std::string call = decode.call->name;
-    const bool is_interlaced = input.ends_with("interlaced") || input.ends_with("interlaced.gif");
+    const bool is_interlaced = input.find("interlaced") != std::string::npos;
     if (input.starts_with("bmp_run_lengths")) return call != "PreInitBMP";
-    if (input == "bmp_core_header") return call == "PreInitBMP";
+    if (input.starts_with("bmp_core_header")) return call == "PreInitBMP";
     const bool is_by_lines = call == "DecodePNGLine" || call == "DecodeGIFLine";
-    return input == "gif_empty" || (is_interlaced && is_by_lines);
+    return input.starts_with("gif_empty") || (is_interlaced && is_by_lines);
 }
 
 TEST_F(Sweeps, every_sound_input_is_decoded_by_every_call_that_takes_it) {
-    for (const std::vector<Input> &inputs : {small_inputs(), sample_inputs()}) {
+    for (const std::vector<Input> &inputs : {tiny_inputs(), small_inputs(), sample_inputs()}) {
         for (const Decode &decode : decodes_of(inputs)) {
             if (decode.input->name == "gif_damaged") continue;
             EXPECT_EQ(writes_a_picture(decode), !is_refused(decode)) << decode.name();

@@ -22,7 +22,10 @@ struct Input {
 // Of the builders: every depth and colour type, every kind of frame; a few hundred pixels each.
 std::vector<Input> small_inputs();
 
-// The same, with the last third missing.
+// Of some tens to a few hundred bytes.
+std::vector<Input> tiny_inputs();
+
+// These, with the last third missing.
 std::vector<Input> cut_short(std::vector<Input> inputs);
 
 // The files in samples/.
