@@ -31,6 +31,9 @@ public:
     // Only what the header allows: a decode must not be forgotten, and one that is parked is for two calls only.
     bool is_legal(const Call &call) const;
 
+    // What was in progress has been given up.
+    void forget() { state_ = State::none; }
+
     // What is wrong with what the call left, or NULL.
     const char *follow(const Call &call, const Step &step, const Left &left);
 

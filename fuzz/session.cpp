@@ -80,7 +80,7 @@ private:
 
     std::unique_ptr<ExactBytes> box_, kept_, rows_;
     std::vector<std::unique_ptr<ExactBytes>> outlived_; // a decode might still write there, wrongly
-    int32_t begun_width_ = 0;
+    Sides begun_{};                                     // box of the decode's first call
 };
 
 Session::Session(const Plan &plan, int32_t filling, bool has_buffers, const Outcome *measured)
@@ -125,7 +125,7 @@ void Session::carry_out_step(const Step &step) {
 }
 
 void Session::make(const Call &call, const Step &step) {
-    if (model_.is_idle()) begun_width_ = step.width;
+    if (model_.is_idle()) begun_ = {step.width, step.height};
     uint8_t *const output = output_for(call, step);
     info_.hasTransparency = untouched;
     info_.outputWidth = info_.outputHeight = static_cast<int32_t>(untouched);
@@ -182,9 +182,10 @@ uint8_t *Session::output_for(const Call &call, const Step &step) {
     const bool idle = info_.decoderState == nullptr;
     switch (call.output) {
     case Output::none: return nullptr;
-    case Output::box: return box_buffer(box_, step, false);
+    // The rows of a box that is too large for a buffer would all be made, to be written outside a smaller one.
+    case Output::box: return !idle && pixels_of(begun_) > largest_output ? nullptr : box_buffer(box_, step, false);
     case Output::kept: return idle ? box_buffer(kept_, step, true) : nullptr;
-    case Output::rows: return buffer(rows_, begun_width_, step.rows, false);
+    case Output::rows: return buffer(rows_, begun_.width, step.rows, false);
     case Output::own_rows: return buffer(rows_, step.width, step.rows, false);
     }
     return nullptr;
@@ -234,6 +235,7 @@ void Session::free_colour_tables() {
 
 void Session::end() {
     give_up(plan_.format, info_);
+    model_.forget();
     free_colour_tables();
     account_.end();
 }
@@ -245,6 +247,7 @@ Outcome Session::run_again() {
     for (std::unique_ptr<ExactBytes> *const buffer : {&box_, &kept_, &rows_})
         if (*buffer != nullptr) outlived_.push_back(std::move(*buffer));
     outcome_ = {};
+    scaled_ = {};
     return run();
 }
 
