@@ -89,7 +89,7 @@ private:
     }
 
     void decode(Span span) {
-        fuzz::Plan &plan = plans_[plan_ = decodes_++ % plan_count];
+        fuzz::Plan &plan = plans_[plan_ = static_cast<size_t>(decodes_++ % plan_count)];
         plan.file = input_->bytes;
         plan.file[byte_] = value_;
         if (span.end != 0) write_checksum(plan.file, span);
