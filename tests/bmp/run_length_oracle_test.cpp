@@ -1,31 +1,15 @@
 // Run-length codes read by SDL as an oracle: of files whose codes both read the same way.
 #include <SDL.h>
 
-#include <memory>
-
 #include "tests/bmp/expectations.h"
 #include "tests/support/run_length_codes.h"
+#include "tests/support/sdl_reader.h"
 #include "tests/support/two_step.h"
 
 namespace pelm::test {
 namespace {
 
 class BmpRunLengthOracle : public HostedTest {};
-
-// The picture as R, G, B from the top left; empty when SDL does not read it.
-Bytes read_by_sdl(const Bytes &file) {
-    SDL_RWops *const stream = SDL_RWFromConstMem(file.data(), static_cast<int>(file.size()));
-    const std::unique_ptr<SDL_Surface, void (*)(SDL_Surface *)> stored(SDL_LoadBMP_RW(stream, 1), SDL_FreeSurface);
-    if (!stored) return {};
-    const std::unique_ptr<SDL_Surface, void (*)(SDL_Surface *)> surface(
-        SDL_ConvertSurfaceFormat(stored.get(), SDL_PIXELFORMAT_RGB24, 0), SDL_FreeSurface);
-    if (!surface) return {};
-    Bytes pixels;
-    const auto *const rows = static_cast<const uint8_t *>(surface->pixels);
-    for (int y = 0; y < surface->h; ++y)
-        pixels.insert(pixels.end(), rows + y * surface->pitch, rows + y * surface->pitch + 3 * surface->w);
-    return pixels;
-}
 
 // Deltas move there, rows end at their width, and the end of the bitmap ends it: these codes are left out.
 TEST_F(BmpRunLengthOracle, sdl_reads_the_same_pixels) {
@@ -43,8 +27,10 @@ TEST_F(BmpRunLengthOracle, sdl_reads_the_same_pixels) {
         const Bytes codes = run_length_codes(rows, bits, noise, habits);
         BmpFile file = run_length_bmp(bits, width, height, codes, noise_palette(1u << bits, noise.next()));
         file.colors_used = 1u << bits;
-        const Bytes expected = read_by_sdl(file_bytes(file));
-        ASSERT_EQ(expected.size(), static_cast<size_t>(width * height * 3)) << SDL_GetError();
+        const std::optional<SdlPicture> picture = read_with_sdl(file_bytes(file));
+        ASSERT_TRUE(picture) << SDL_GetError();
+        const Bytes &expected = picture->rgb;
+        ASSERT_EQ(expected.size(), static_cast<size_t>(width * height * 3));
 
         for (const uint32_t kind : all_kinds) {
             host.reset();

@@ -76,6 +76,63 @@ std::optional<GiflibFile> read_with_giflib(const Bytes &file) {
     return read;
 }
 
+namespace {
+
+bool skip_extension(GifFileType *gif) {
+    int label = 0;
+    GifByteType *block = nullptr;
+    if (DGifGetExtension(gif, &label, &block) != GIF_OK) return false;
+    while (block != nullptr)
+        if (DGifGetExtensionNext(gif, &block) != GIF_OK) return false;
+    return true;
+}
+
+bool goes_on_to_an_image(GifFileType *gif) {
+    GifRecordType record = UNDEFINED_RECORD_TYPE;
+    while (DGifGetRecordType(gif, &record) == GIF_OK) {
+        if (record == IMAGE_DESC_RECORD_TYPE) return DGifGetImageDesc(gif) == GIF_OK;
+        if (record != EXTENSION_RECORD_TYPE || !skip_extension(gif)) return false;
+    }
+    return false;
+}
+
+// Rows as they are stored go to the screen rows that the interlacing says.
+bool take_rows(GifFileType *gif, GiflibImage &image) {
+    const size_t width = image.place.width;
+    image.indices.resize(width * image.place.height);
+    std::vector<uint32_t> order = interlaced_order(image.place.height);
+    for (uint32_t row = 0; row < image.place.height; ++row) {
+        const uint32_t to = image.place.interlaced ? order[row] : row;
+        if (DGifGetLine(gif, image.indices.data() + to * width, static_cast<int>(width)) != GIF_OK) return false;
+    }
+    return true;
+}
+
+} // namespace
+
+std::optional<GiflibFile> first_image_with_giflib(const Bytes &file) {
+    Reading reading{file, 0};
+    int error = 0;
+    GifFileType *const gif = DGifOpen(&reading, read_bytes, &error);
+    if (gif == nullptr) return std::nullopt;
+    std::optional<GiflibFile> read;
+    if (goes_on_to_an_image(gif)) {
+        const GifImageDesc &desc = gif->Image;
+        GiflibImage image;
+        image.place = {static_cast<uint16_t>(desc.Left), static_cast<uint16_t>(desc.Top),
+                       static_cast<uint16_t>(desc.Width), static_cast<uint16_t>(desc.Height), desc.Interlace};
+        image.local = table_of(desc.ColorMap);
+        if (image.place.width != 0 && image.place.height != 0 && take_rows(gif, image))
+            read = GiflibFile{static_cast<uint16_t>(gif->SWidth),
+                              static_cast<uint16_t>(gif->SHeight),
+                              static_cast<uint8_t>(gif->SBackGroundColor),
+                              table_of(gif->SColorMap),
+                              {image}};
+    }
+    DGifCloseFile(gif, &error);
+    return read;
+}
+
 std::array<uint8_t, 3> table_colour(const ColourTable &table, size_t index) {
     if (index * 3 + 2 >= table.size()) return {};
     return {table[index * 3], table[index * 3 + 1], table[index * 3 + 2]};

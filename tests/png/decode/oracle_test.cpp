@@ -1,80 +1,16 @@
 // Pixels at their own size against libpng, for the PNG suite, the shared pictures and generated files.
-#include <png.h>
-
-#include <csetjmp>
 #include <cstdlib>
-#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iostream>
 
 #include "tests/png/decode/decoding.h"
+#include "tests/png/support/libpng_reader.h"
 
 namespace pelm::test {
 namespace {
 
 namespace fs = std::filesystem;
-
-struct Header {
-    uint32_t width, height;
-    uint8_t depth, colour_type;
-};
-
-struct Reading {
-    const Bytes &file;
-    size_t at;
-};
-
-void read_bytes(png_structp png, png_bytep to, size_t count) {
-    Reading &reading = *static_cast<Reading *>(png_get_io_ptr(png));
-    if (count > reading.file.size() - reading.at) png_error(png, "end of data");
-    memcpy(to, reading.file.data() + reading.at, count);
-    reading.at += count;
-}
-
-void ignore_message(png_structp, png_const_charp) {}
-
-// libpng's RGBA: 16 bits cut, everything expanded. Nothing that needs destruction lives where it may jump from.
-bool read_all(png_structp png, png_infop info, Bytes &rgba, Header &header) {
-    if (setjmp(png_jmpbuf(png))) return false;
-    png_read_info(png, info);
-    header = {png_get_image_width(png, info), png_get_image_height(png, info), png_get_bit_depth(png, info),
-              png_get_color_type(png, info)};
-    png_set_strip_16(png);
-    png_set_expand(png);
-    png_set_gray_to_rgb(png);
-    png_set_add_alpha(png, 255, PNG_FILLER_AFTER);
-    png_read_update_info(png, info);
-    rgba.resize(size_t{header.width} * header.height * 4);
-    for (uint32_t y = 0; y < header.height; ++y)
-        png_read_row(png, rgba.data() + size_t{y} * header.width * 4, nullptr);
-    png_read_end(png, nullptr);
-    return true;
-}
-
-bool libpng_rgba(const Bytes &file, Bytes &rgba, Header &header) {
-    png_structp png = png_create_read_struct(PNG_LIBPNG_VER_STRING, nullptr, nullptr, ignore_message);
-    png_infop info = png_create_info_struct(png);
-    Reading reading{file, 0};
-    png_set_error_fn(png, nullptr, nullptr, ignore_message);
-    png_set_read_fn(png, &reading, read_bytes);
-    const bool good = read_all(png, info, rgba, header);
-    png_destroy_read_struct(&png, &info, nullptr);
-    return good;
-}
-
-// Grey of 2 and 4 bits is widened with ones here, and below 8 bits no transparent colour is looked for.
-void as_this_library_widens(Bytes &rgba, const Header &header) {
-    if (header.colour_type != PNG_COLOR_TYPE_GRAY || header.depth >= 8) return;
-    const unsigned levels = (1u << header.depth) - 1;
-    for (size_t i = 0; i < rgba.size(); i += 4) {
-        const unsigned sample = rgba[i] / (255 / levels);
-        const unsigned low = 8u - header.depth;
-        const unsigned wide = header.depth == 1 ? sample * 255 : sample << low | ((1u << low) - 1);
-        rgba[i] = rgba[i + 1] = rgba[i + 2] = static_cast<uint8_t>(wide);
-        rgba[i + 3] = 255;
-    }
-}
 
 class PngOracle : public PngDecoding {
 protected:
@@ -99,11 +35,11 @@ protected:
 
     // Empty when both agree, in every way of calling.
     static std::string disagreement(const Bytes &file) {
-        Bytes wanted;
-        Header header;
-        if (!libpng_rgba(file, wanted, header)) return "libpng refuses it";
-        as_this_library_widens(wanted, header);
-        const Request request{7, 0, static_cast<int32_t>(header.width), static_cast<int32_t>(header.height)};
+        std::optional<LibpngPicture> picture = read_with_libpng(file);
+        if (!picture) return "libpng refuses it";
+        as_this_library_widens(*picture);
+        const Bytes &wanted = picture->rgba;
+        const Request request{7, 0, static_cast<int32_t>(picture->width), static_cast<int32_t>(picture->height)};
         for (const uint32_t kind : {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM})
             for (const Call call : {Call::one_shot, Call::iterative, Call::line}) {
                 const Outcome outcome = run(file, kind, request, wanted.size(), call, 7, 1 << 20);
