@@ -10,6 +10,7 @@ using namespace pelm;
 
 constexpr uint32_t alphas_per_entry = 3; // room in paletteAlpha
 
+// Required: alphas without an entry are passed over, the others count (docs/oddities.md, "Alphas beyond the palette").
 uint32_t read_palette_alphas(PngDecodeState &state, PngInputBuffer &input, uint32_t length) {
     const uint32_t room = alphas_per_entry * state.paletteCount;
     for (uint32_t i = 0; i < length; ++i) {
@@ -42,6 +43,7 @@ uint32_t read_grey_key(const PngDecodeState &state, PngInputBuffer &input, uint3
     return PNG_DONE;
 }
 
+// Required: at 8 bits a key is compared in all its bits (docs/oddities.md, "Colour keys above 255").
 uint32_t read_rgb_key(const PngDecodeState &state, PngInputBuffer &input, uint32_t length, PngDecodeState &target) {
     if (length != 6) return PNG_BAD_DATA;
     if (!have_bytes(input, 6)) return PNG_FORMAT_ERROR;

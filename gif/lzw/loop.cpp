@@ -23,6 +23,7 @@ void put_known(Lzw &lzw, uint32_t code) {
 }
 
 // The string before with its own first pixel behind it. Returns the code that it extends.
+// Required: for any code that the table does not hold (docs/oddities.md, "Codes that are not in the table").
 uint32_t put_unknown(Lzw &lzw) {
     uint32_t prefix = lzw.previous < lzw.next_code ? lzw.previous : 0;
     if (lzw.tables.length[prefix] > longest_string) prefix = 0;

@@ -24,7 +24,8 @@ struct GiflibFile {
 
 std::optional<GiflibFile> read_with_giflib(const Bytes &file);
 
-// The first image alone, whatever follows it; `images` has one entry, without its control. Nothing when giflib reads none.
+// The first image alone, whatever follows it; `images` has one entry, without its control. Nothing when giflib reads
+// none.
 std::optional<GiflibFile> first_image_with_giflib(const Bytes &file);
 
 // Three bytes, or black where the table ends before.

@@ -25,6 +25,10 @@ void read_bytes(png_structp png, png_bytep to, size_t count) {
 
 void ignore_message(png_structp, png_const_charp) {}
 
+void leave(png_structp png, png_const_charp) {
+    png_longjmp(png, 1);
+}
+
 // Nothing that needs destruction lives where libpng may jump from.
 bool read_all(png_structp png, png_infop info, LibpngPicture &picture) {
     if (setjmp(png_jmpbuf(png))) return false;
@@ -52,11 +56,10 @@ bool read_all(png_structp png, png_infop info, LibpngPicture &picture) {
 } // namespace
 
 std::optional<LibpngPicture> read_with_libpng(const Bytes &file) {
-    png_structp png = png_create_read_struct(PNG_LIBPNG_VER_STRING, nullptr, nullptr, ignore_message);
+    png_structp png = png_create_read_struct(PNG_LIBPNG_VER_STRING, nullptr, leave, ignore_message);
     png_infop info = png_create_info_struct(png);
     Reading reading{file, 0};
     LibpngPicture picture{};
-    png_set_error_fn(png, nullptr, nullptr, ignore_message);
     png_set_read_fn(png, &reading, read_bytes);
     png_set_option(png, PNG_IGNORE_ADLER32, PNG_OPTION_ON);
     const bool good = read_all(png, info, picture);
