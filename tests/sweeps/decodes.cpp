@@ -1,7 +1,7 @@
 #include "tests/sweeps/decodes.h"
 
 #include <algorithm>
-#include <sstream>
+#include <cstdio>
 #include <string_view>
 
 namespace pelm::sweeps {
@@ -118,10 +118,12 @@ std::vector<Decode> decodes_of(const std::vector<Input> &inputs) {
 }
 
 std::string Setting::name() const {
-    std::ostringstream text;
-    text << "format " << format << ", box " << width << "x" << height << ", rotation " << rotation * 90 / PELM_ROTATE_90
-         << ", placement 0x" << std::hex << placement << std::dec << ", source of kind " << kind;
-    return text.str();
+    char text[160];
+    snprintf(text, sizeof text, "format %u, box %dx%d, rotation %u, placement 0x%x, source of kind %u",
+             static_cast<unsigned>(format), static_cast<int>(width), static_cast<int>(height),
+             static_cast<unsigned>(rotation * 90 / PELM_ROTATE_90), static_cast<unsigned>(placement),
+             static_cast<unsigned>(kind));
+    return text;
 }
 
 Setting nth_setting(const Input &input, uint32_t output_format, uint32_t n) {

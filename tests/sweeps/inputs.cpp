@@ -1,8 +1,6 @@
 #include "tests/sweeps/inputs.h"
 
-#include <filesystem>
-#include <fstream>
-#include <iterator>
+#include <cstdio>
 #include <stdexcept>
 
 #include "tests/gif/support/gif_builder.h"
@@ -123,18 +121,23 @@ void add_gifs(std::vector<Input> &inputs) {
     add(inputs, "gif_damaged", Format::gif, damaged);
 }
 
-Format format_of(const std::filesystem::path &file) {
-    const std::string ending = file.extension().string();
-    return ending == ".bmp"   ? Format::bmp
-           : ending == ".png" ? Format::png
-           : ending == ".gif" ? Format::gif
-                              : Format::wbmp;
+Format format_of(const std::string &file) {
+    return file.ends_with(".bmp")   ? Format::bmp
+           : file.ends_with(".png") ? Format::png
+           : file.ends_with(".gif") ? Format::gif
+                                    : Format::wbmp;
 }
 
-Bytes content_of(const std::filesystem::path &file) {
-    std::ifstream stream(file, std::ios::binary);
-    if (!stream) throw std::runtime_error("cannot read " + file.string());
-    return Bytes(std::istreambuf_iterator<char>(stream), {});
+// By the C library, which MemorySanitizer knows.
+Bytes content_of_sample(const std::string &name) {
+    FILE *const file = fopen((std::string(PELM_SAMPLES "/") + name).c_str(), "rb");
+    if (file == nullptr) throw std::runtime_error("cannot read " + name);
+    Bytes bytes;
+    uint8_t part[4096];
+    for (size_t count = fread(part, 1, sizeof part, file); count > 0; count = fread(part, 1, sizeof part, file))
+        bytes.insert(bytes.end(), part, part + count);
+    fclose(file);
+    return bytes;
 }
 
 } // namespace
@@ -162,11 +165,9 @@ std::vector<Input> sample_inputs() {
          {"sunset-1.bmp", "sunset-32.bmp", "sunset-4.bmp", "sunset-444.bmp", "sunset-555.bmp", "sunset-565.bmp",
           "sunset-8.bmp", "sunset-topdown.bmp", "sunset.bmp", "sunset.wbmp", "sunset-alpha.png", "sunset-grey.png",
           "sunset-palette.png", "sunset.png", "sunset-interlaced.gif", "sunset.gif"}) {
-        const std::filesystem::path file = std::filesystem::path(PELM_SAMPLES) / name;
-        inputs.push_back({name, format_of(file), 320, 240, content_of(file)});
+        inputs.push_back({name, format_of(name), 320, 240, content_of_sample(name)});
     }
-    const std::filesystem::path animation = std::filesystem::path(PELM_SAMPLES) / "lighthouse.gif";
-    inputs.push_back({"lighthouse.gif", Format::gif, 160, 120, content_of(animation)});
+    inputs.push_back({"lighthouse.gif", Format::gif, 160, 120, content_of_sample("lighthouse.gif")});
     return inputs;
 }
 

@@ -1,7 +1,6 @@
 #include "tests/gif/support/lzw_encoder.h"
 
-#include <map>
-#include <utility>
+#include <array>
 
 namespace pelm::test {
 
@@ -10,8 +9,8 @@ namespace {
 constexpr uint32_t table_size = 4096;
 constexpr int widest = 12;
 
-// String plus one more pixel gives string.
-using Strings = std::map<std::pair<uint32_t, uint8_t>, uint32_t>;
+// For each string: which one it becomes with one more pixel behind it; 0: none.
+using Strings = std::vector<std::array<uint16_t, 256>>;
 
 class Encoder {
 public:
@@ -32,16 +31,21 @@ private:
         clear_when_due();
         uint32_t string = pixels[at++];
         while (at < pixels.size()) {
-            const auto longer = strings_.find({string, pixels[at]});
-            if (longer == strings_.end()) break;
-            string = longer->second;
+            const uint32_t longer = string < strings_.size() ? strings_[string][pixels[at]] : 0;
+            if (longer == 0) break;
+            string = longer;
             ++at;
         }
         codes_.push_back(string);
         ++since_clear_;
         const bool grows = min_ >= 2 && !options_.literals_only;
-        if (at < pixels.size() && grows && next_ < table_size) strings_[{string, pixels[at]}] = next_++;
+        if (at < pixels.size() && grows && next_ < table_size) add(string, pixels[at]);
         return at;
+    }
+
+    void add(uint32_t string, uint8_t pixel) {
+        if (string >= strings_.size()) strings_.resize(string + 1);
+        strings_[string][pixel] = static_cast<uint16_t>(next_++);
     }
 
     void clear_when_due() {

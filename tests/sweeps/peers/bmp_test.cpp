@@ -1,8 +1,8 @@
 // Mutated BMP files beside SDL: what both read shows the same pixels, but for what docs/oddities.md states.
 #include "tests/support/run_length_codes.h"
 #include "tests/support/sdl_reader.h"
+#include "tests/sweeps/mutations.h"
 #include "tests/sweeps/peers/comparison.h"
-#include "tests/sweeps/peers/mutations.h"
 #include "tests/sweeps/tally.h"
 
 namespace pelm::sweeps {

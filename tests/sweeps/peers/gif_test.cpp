@@ -1,8 +1,8 @@
 // Mutated GIF files beside giflib: what both read shows the same pixels, but for what docs/oddities.md states.
 #include "tests/gif/support/giflib_reader.h"
+#include "tests/sweeps/mutations.h"
 #include "tests/sweeps/peers/comparison.h"
 #include "tests/sweeps/peers/gif_walk.h"
-#include "tests/sweeps/peers/mutations.h"
 #include "tests/sweeps/tally.h"
 
 namespace pelm::sweeps {

@@ -1,8 +1,8 @@
 // Mutated PNG files beside libpng: what both read shows the same pixels, but for what docs/oddities.md states.
 #include "tests/png/support/libpng_reader.h"
 #include "tests/png/support/png_builder.h"
+#include "tests/sweeps/mutations.h"
 #include "tests/sweeps/peers/comparison.h"
-#include "tests/sweeps/peers/mutations.h"
 #include "tests/sweeps/tally.h"
 
 namespace pelm::sweeps {

@@ -1,4 +1,4 @@
-#include "tests/sweeps/peers/mutations.h"
+#include "tests/sweeps/mutations.h"
 
 #include <algorithm>
 
