@@ -1,14 +1,11 @@
 #include "tests/sweeps/equality.h"
 
-#include <algorithm>
-
 namespace pelm::sweeps {
 namespace {
 
 using fuzz::Call;
 using fuzz::Format;
 
-constexpr uint32_t streams[] = {PELM_SOURCE_STREAM, PELM_SOURCE_STREAM_ALT, PELM_SOURCE_SEQUENTIAL};
 constexpr uint32_t memory_and_streams[] = {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM, PELM_SOURCE_STREAM_ALT,
                                            PELM_SOURCE_SEQUENTIAL};
 

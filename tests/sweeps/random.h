@@ -1,8 +1,10 @@
 // Numbers without a pattern, the same in every build.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <random>
+#include <vector>
 
 namespace pelm::sweeps {
 
@@ -14,6 +16,13 @@ public:
     uint32_t between(uint32_t low, uint32_t high) { return low + below(high - low + 1); }
     bool one_in(uint32_t count) { return below(count) == 0; }
     uint8_t byte() { return static_cast<uint8_t>(next() >> 24); }
+
+    std::vector<uint8_t> noise(size_t size) {
+        std::vector<uint8_t> bytes(size);
+        for (uint8_t &one : bytes)
+            one = byte();
+        return bytes;
+    }
 
 private:
     std::mt19937 engine_;

@@ -2,13 +2,13 @@
 #include "tests/png/support/libpng_reader.h"
 #include "tests/png/support/png_builder.h"
 #include "tests/sweeps/mutations.h"
+#include "tests/sweeps/peers/any_png.h"
 #include "tests/sweeps/peers/comparison.h"
 #include "tests/sweeps/tally.h"
 
 namespace pelm::sweeps {
 namespace {
 
-using test::Chunk;
 using test::LibpngPicture;
 
 uint32_t big_u32(const Bytes &bytes, size_t at) {
@@ -70,64 +70,6 @@ std::string explanation(const Bytes &file, const LibpngPicture &picture) {
     return "";
 }
 
-// Chunks left out, doubled, swapped, changed in their data; other rows, colours and alphas of any length.
-Bytes rebuilt(Random &random) {
-    static constexpr uint8_t types[][2] = {{0, 1}, {0, 2}, {0, 4}, {0, 8}, {0, 16}, {2, 8}, {2, 16}, {3, 1},
-                                           {3, 2}, {3, 4}, {3, 8}, {4, 8}, {4, 16}, {6, 8}, {6, 16}};
-    const auto &[colour_type, depth] = types[random.below(std::size(types))];
-    test::Png png{.width = random.between(1, 40),
-                  .height = random.between(1, 30),
-                  .colour_type = colour_type,
-                  .depth = depth,
-                  .interlace = random.one_in(3) ? uint8_t{1} : uint8_t{0}};
-    png.rows = random.one_in(3) ? smooth_rows(png) : noise_rows(png, random.next());
-    png.filters.clear();
-    for (uint32_t i = 0; i < 9; ++i)
-        png.filters.push_back(static_cast<uint8_t>(random.below(random.one_in(40) ? 6 : 5)));
-    const auto any_bytes = [&random](size_t count) {
-        Bytes bytes(count);
-        for (uint8_t &byte : bytes)
-            byte = random.byte();
-        return bytes;
-    };
-    if (colour_type == 3 || random.one_in(8))
-        png.plte = any_bytes(3 * random.between(1, 1u << std::min<uint32_t>(depth, 8)));
-    if (colour_type == 3 && random.one_in(2))
-        png.trns =
-            any_bytes(random.between(1, static_cast<uint32_t>(png.plte->size() / 3) + (random.one_in(9) ? 5 : 0)));
-    if (colour_type < 3 && random.one_in(2)) png.trns = any_bytes(colour_type == 0 ? 2 : 6);
-    if (png.trns && colour_type < 3 && depth < 16 && !random.one_in(4)) // values that samples have
-        for (size_t i = 0; i < png.trns->size(); ++i)
-            (*png.trns)[i] = i % 2 == 0 ? uint8_t{0} : static_cast<uint8_t>((*png.trns)[i] & ((1u << depth) - 1));
-    png.level = static_cast<int>(random.below(10));
-    if (random.one_in(2)) png.idat_size = random.between(1, 600);
-    std::vector<Chunk> chunks = chunks_of(png);
-    const auto any_place = [&] {
-        return chunks.begin() + static_cast<ptrdiff_t>(random.below(static_cast<uint32_t>(chunks.size())));
-    };
-    for (uint32_t changes = random.below(3); changes > 0; --changes) {
-        static constexpr const char *others[] = {"tEXt", "gAMA", "bKGD", "sBIT", "pHYs", "tIME", "hIST", "abCd"};
-        const auto place = any_place();
-        switch (random.below(6)) {
-        case 0:
-            chunks.insert(place, {others[random.below(std::size(others))], any_bytes(random.between(1, 30))});
-            break;
-        case 1: {
-            const Chunk again = *any_place();
-            chunks.insert(place, again);
-            break;
-        }
-        case 2: chunks.erase(place); break;
-        case 3: std::iter_swap(place, any_place()); break;
-        default:
-            if (place->type != "IHDR" && !place->data.empty())
-                place->data[random.below(static_cast<uint32_t>(place->data.size()))] = random.byte();
-        }
-        if (chunks.empty()) break;
-    }
-    return file_of(chunks);
-}
-
 class PngPeers : public Comparison {};
 
 TEST_P(PngPeers, show_the_same_pixels) {
@@ -136,7 +78,7 @@ TEST_P(PngPeers, show_the_same_pixels) {
     const uint32_t all = by_extent(100u, 1000u, 10000u);
     for (uint32_t i = 0; i < all; ++i) {
         const Bytes &sound = inputs[random.below(static_cast<uint32_t>(inputs.size()))].bytes;
-        const Bytes file = random.one_in(3) ? with_right_checksums(mutated(random, sound, 33)) : rebuilt(random);
+        const Bytes file = random.one_in(3) ? with_right_checksums(mutated(random, sound, 33)) : any_png_file(random);
         std::optional<LibpngPicture> picture = test::read_with_libpng(file);
         if (picture) as_this_library_widens(*picture);
         const auto width = picture ? static_cast<int32_t>(picture->width) : 64;

@@ -103,11 +103,4 @@ test::Tokens any_tokens(Random &random, const test::DynamicCodes &codes, uint32_
     return tokens;
 }
 
-Bytes noise(Random &random, size_t size) {
-    Bytes bytes(size);
-    for (uint8_t &byte : bytes)
-        byte = random.byte();
-    return bytes;
-}
-
 } // namespace pelm::sweeps

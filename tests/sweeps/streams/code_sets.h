@@ -25,6 +25,4 @@ std::vector<uint32_t> used_symbols(const Bytes &lengths);
 // Up to `count` elements of the codes, at any length and distance that they can name, and no end of the block.
 test::Tokens any_tokens(Random &random, const test::DynamicCodes &codes, uint32_t count);
 
-Bytes noise(Random &random, size_t size);
-
 } // namespace pelm::sweeps

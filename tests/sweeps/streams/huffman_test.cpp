@@ -19,7 +19,7 @@ class HuffmanSweep : public testing::Test {
 protected:
     // What a block's codes are followed by: all zeros, all ones, or noise.
     Bytes data(uint32_t kind) {
-        return kind < 2 ? Bytes(bytes_behind, kind == 0 ? uint8_t{0} : uint8_t{255}) : noise(random, bytes_behind);
+        return kind < 2 ? Bytes(bytes_behind, kind == 0 ? uint8_t{0} : uint8_t{255}) : random.noise(bytes_behind);
     }
 
     // False when the stream was decompressed otherwise than by the model.
@@ -160,7 +160,7 @@ protected:
         Deflate deflate;
         if (random.one_in(3)) {
             const uint32_t size = random.one_in(2) ? 32768 - random.below(700) : random.below(400);
-            deflate.stored(noise(random, size), Last::no);
+            deflate.stored(random.noise(size), Last::no);
         }
         deflate.block_header(2, random.one_in(2) ? Last::yes : Last::no);
         deflate.dynamic_header(codes);

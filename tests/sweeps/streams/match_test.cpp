@@ -43,7 +43,7 @@ TEST_P(MatchSweep, every_length_at_every_distance) {
             }
         }
         Deflate deflate;
-        deflate.stored(noise(random, window + random.below(300)), Last::no);
+        deflate.stored(random.noise(window + random.below(300)), Last::no);
         deflate.fixed(tokens, Last::yes);
         if (!holds(deflate)) return;
     }
@@ -59,7 +59,7 @@ TEST_P(MatchSweep, over_the_windows_end_from_every_place_before_it) {
     for (uint32_t before_end = GetParam(); before_end < 330; before_end += 4) {
         for (uint32_t n = before_end % step; n < std::size(distances) * std::size(lengths); n += step) {
             const uint32_t literals = random.below(24);
-            Tokens tokens = test::literals(noise(random, literals));
+            Tokens tokens = test::literals(random.noise(literals));
             tokens.push_back(test::match(lengths[n % std::size(lengths)], distances[n / std::size(lengths)]));
             for (uint32_t i = 0; i < 12; ++i) {
                 tokens.push_back(test::literal(random.byte()));
@@ -69,7 +69,7 @@ TEST_P(MatchSweep, over_the_windows_end_from_every_place_before_it) {
             Deflate deflate;
             const uint32_t round = random.one_in(4) ? window : 0;
             const size_t size = round + window - before_end - literals;
-            deflate.stored(noise(random, size % 4096), Last::no);
+            deflate.stored(random.noise(size % 4096), Last::no);
             deflate.stored(Bytes(size - size % 4096, random.byte()), Last::no);
             deflate.fixed(tokens, Last::yes);
             if (!holds(deflate)) return;
@@ -82,7 +82,7 @@ TEST_P(MatchSweep, from_before_the_beginning) {
     const uint32_t step = by_extent(101u, 11u, 1u);
     for (uint32_t before = GetParam(); before < 70; before += 4) {
         for (uint32_t n = before % step; n < std::size(distances) * std::size(lengths); n += step) {
-            Tokens tokens = test::literals(noise(random, before));
+            Tokens tokens = test::literals(random.noise(before));
             const uint32_t distance = before + distances[n / std::size(lengths)];
             tokens.push_back(test::match(lengths[n % std::size(lengths)], std::min(distance, window)));
             for (uint32_t i = 0; i < 20; ++i) {

@@ -35,7 +35,7 @@ void dynamic_block(Random &random, Deflate &deflate, uint32_t elements, Last las
 void block(Random &random, Deflate &deflate, Last last) {
     const uint32_t elements = random.one_in(3) ? random.below(400) : random.below(30);
     switch (random.below(4)) {
-    case 0: return deflate.stored(noise(random, elements), last);
+    case 0: return deflate.stored(random.noise(elements), last);
     case 1: return deflate.fixed(fixed_tokens(random, elements), last);
     default: return dynamic_block(random, deflate, elements, last);
     }
@@ -43,11 +43,11 @@ void block(Random &random, Deflate &deflate, Last last) {
 
 Bytes stream_of_blocks(Random &random, bool may_begin_with_a_window) {
     Deflate deflate;
-    if (may_begin_with_a_window && random.one_in(4)) deflate.stored(noise(random, 32768 - random.below(600)), Last::no);
+    if (may_begin_with_a_window && random.one_in(4)) deflate.stored(random.noise(32768 - random.below(600)), Last::no);
     for (uint32_t blocks = random.below(5); blocks > 0; --blocks)
         block(random, deflate, Last::no);
     block(random, deflate, Last::yes);
-    deflate.bits.put_bytes(noise(random, random.below(20)));
+    deflate.bits.put_bytes(random.noise(random.below(20)));
     return zlib_of(deflate.bytes());
 }
 
