@@ -153,7 +153,11 @@ TEST_P(Equality, of_all_ways_of_small_inputs) {
 }
 
 TEST_P(Equality, of_all_ways_of_the_samples) {
-    sweep(sample_inputs(), by_extent(1u, 1u, 5u), false);
+    std::vector<Input> inputs;
+    uint32_t number = 0;
+    for (Input &sample : sample_inputs()) // in a quick run each of them on one shard alone
+        if (by_extent(number++ % shards == GetParam(), true, true)) inputs.push_back(std::move(sample));
+    sweep(inputs, by_extent(1u, 1u, 5u), false);
     tell("decodes of samples that came out the same", comparisons, 1000);
 }
 

@@ -1,5 +1,6 @@
 #include "tests/sweeps/streams/inflate_ways.h"
 
+#include <algorithm>
 #include <cstring>
 #include <sstream>
 #include <stdexcept>
@@ -154,7 +155,7 @@ InflateWays::~InflateWays() {
 uint8_t *InflateWays::flush(std::span<const uint8_t> bytes) {
     if (bytes.size() > area_.size) PelmTest_TakeArea(&area_, 2 * bytes.size(), PELM_TEST_AREA_AT_END);
     uint8_t *const at = area_.bytes + area_.size - bytes.size();
-    std::memcpy(at, bytes.data(), bytes.size());
+    std::copy(bytes.begin(), bytes.end(), at);
     return at;
 }
 
