@@ -1,11 +1,17 @@
-// A few bytes as 16-bit lanes, computed on all at once: the compilers' portable vector types, for code whose plain form
-// stands beside it.
+// Sixteen bytes or eight 16-bit numbers at once: the compilers' portable vector types, and the few operations that
+// these lack. For code whose plain form stands beside it.
 #pragma once
 
 #include <bit>
 #include <cstdint>
 #include <cstring>
 #include <type_traits>
+
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#elif defined(__ARM_NEON)
+#include <arm_neon.h>
+#endif
 
 namespace pelm {
 
@@ -19,8 +25,10 @@ constexpr bool lanes_are_fast = false;
 // All of it is inlined: no call passes lanes, whatever the platform's convention for them.
 #pragma GCC diagnostic ignored "-Wpsabi"
 
+using Bytes16 = uint8_t __attribute__((vector_size(16)));
 using Lanes = int16_t __attribute__((vector_size(16)));
-using LaneBytes = uint8_t __attribute__((vector_size(8)));
+using Words4 = uint32_t __attribute__((vector_size(16)));
+using Words2 = uint64_t __attribute__((vector_size(16)));
 
 // Bytes in memory as a number whose low byte is the first, put together from whole loads: bytes that were stored singly
 // a moment ago would keep a wider load waiting.
@@ -46,30 +54,169 @@ inline void store_little(uint8_t *to, uint64_t bytes) {
     if constexpr (count > head) store_little<count - head>(to + head, bytes >> (8 * head));
 }
 
-// `count` bytes (8 at most) into the first lanes; zeros in the others.
+// `count` bytes into the first lanes; zeros in the others.
 template <uint32_t count>
-inline Lanes load_lanes(const uint8_t *from) {
-    return __builtin_convertvector(std::bit_cast<LaneBytes>(load_little<count>(from)), Lanes);
+inline Bytes16 load_bytes(const uint8_t *from) {
+    if constexpr (count == 16) {
+        Bytes16 bytes;
+        std::memcpy(&bytes, from, 16);
+        return bytes;
+    } else if constexpr (count > 8) {
+        return std::bit_cast<Bytes16>(Words2{load_little<8>(from), load_little<count - 8>(from + 8)});
+    } else if constexpr (count > 4) {
+        return std::bit_cast<Bytes16>(Words2{load_little<count>(from), 0});
+    } else {
+        return std::bit_cast<Bytes16>(Words4{static_cast<uint32_t>(load_little<count>(from)), 0, 0, 0});
+    }
 }
 
-// The low byte of each of the first `count` lanes.
+// The first `count` lanes.
 template <uint32_t count>
-inline void store_lanes(uint8_t *to, Lanes lanes) {
-    store_little<count>(to, std::bit_cast<uint64_t>(__builtin_convertvector(lanes, LaneBytes)));
+inline void store_bytes(uint8_t *to, Bytes16 bytes) {
+    if constexpr (count == 16) {
+        std::memcpy(to, &bytes, 16);
+    } else if constexpr (count > 8) {
+        const auto words = std::bit_cast<Words2>(bytes);
+        store_little<8>(to, words[0]);
+        store_little<count - 8>(to + 8, words[1]);
+    } else if constexpr (count > 4) {
+        store_little<count>(to, std::bit_cast<Words2>(bytes)[0]);
+    } else {
+        store_little<count>(to, std::bit_cast<Words4>(bytes)[0]);
+    }
 }
 
-inline Lanes low_byte(Lanes lanes) {
-    return lanes & 0xFF;
+// Every byte `count` lanes up, with zeros below; and down.
+template <uint32_t count>
+inline Bytes16 move_up(Bytes16 bytes) {
+#if defined(__SSE2__)
+    return std::bit_cast<Bytes16>(_mm_slli_si128(std::bit_cast<__m128i>(bytes), count));
+#elif defined(__ARM_NEON)
+    return std::bit_cast<Bytes16>(vextq_u8(vdupq_n_u8(0), std::bit_cast<uint8x16_t>(bytes), 16 - count));
+#else
+    Bytes16 moved{};
+    for (uint32_t i = count; i < 16; ++i)
+        moved[i] = bytes[i - count];
+    return moved;
+#endif
 }
 
-inline Lanes magnitude(Lanes lanes) {
-    const Lanes sign = lanes >> 15;
-    return (lanes ^ sign) - sign;
+template <uint32_t count>
+inline Bytes16 move_down(Bytes16 bytes) {
+#if defined(__SSE2__)
+    return std::bit_cast<Bytes16>(_mm_srli_si128(std::bit_cast<__m128i>(bytes), count));
+#elif defined(__ARM_NEON)
+    return std::bit_cast<Bytes16>(vextq_u8(std::bit_cast<uint8x16_t>(bytes), vdupq_n_u8(0), count));
+#else
+    Bytes16 moved{};
+    for (uint32_t i = count; i < 16; ++i)
+        moved[i - count] = bytes[i];
+    return moved;
+#endif
 }
 
-// `mask` is all ones or all zeros in each lane, as comparisons give it.
-inline Lanes choose(Lanes mask, Lanes yes, Lanes no) {
-    return (mask & yes) | (~mask & no);
+// The first eight bytes as numbers.
+inline Lanes widen(Bytes16 bytes) {
+#if defined(__SSE2__)
+    return std::bit_cast<Lanes>(_mm_unpacklo_epi8(std::bit_cast<__m128i>(bytes), _mm_setzero_si128()));
+#elif defined(__ARM_NEON)
+    return std::bit_cast<Lanes>(vmovl_u8(vget_low_u8(std::bit_cast<uint8x16_t>(bytes))));
+#else
+    Lanes lanes{};
+    for (uint32_t i = 0; i < 8; ++i)
+        lanes[i] = bytes[i];
+    return lanes;
+#endif
+}
+
+// Numbers from 0 to 255 as the first eight bytes.
+inline Bytes16 narrow(Lanes lanes) {
+#if defined(__SSE2__)
+    return std::bit_cast<Bytes16>(_mm_packus_epi16(std::bit_cast<__m128i>(lanes), _mm_setzero_si128()));
+#elif defined(__ARM_NEON)
+    return std::bit_cast<Bytes16>(vcombine_u8(vmovn_u16(std::bit_cast<uint16x8_t>(lanes)), vdup_n_u8(0)));
+#else
+    Bytes16 bytes{};
+    for (uint32_t i = 0; i < 8; ++i)
+        bytes[i] = static_cast<uint8_t>(lanes[i]);
+    return bytes;
+#endif
+}
+
+// The last `unit` bytes (1, 2, 4 or 8) over and over.
+template <uint32_t unit>
+inline Bytes16 last_everywhere(Bytes16 bytes) {
+    if constexpr (unit == 8) {
+        const auto words = std::bit_cast<Words2>(bytes);
+        return std::bit_cast<Bytes16>(__builtin_shufflevector(words, words, 1, 1));
+    } else if constexpr (unit == 4) {
+        const auto words = std::bit_cast<Words4>(bytes);
+        return std::bit_cast<Bytes16>(__builtin_shufflevector(words, words, 3, 3, 3, 3));
+    } else if constexpr (unit == 2) {
+        const auto lanes = std::bit_cast<Lanes>(bytes);
+        return std::bit_cast<Bytes16>(__builtin_shufflevector(lanes, lanes, 7, 7, 7, 7, 7, 7, 7, 7));
+    } else {
+        return last_everywhere<2>(
+            __builtin_shufflevector(bytes, bytes, 8, 8, 9, 9, 10, 10, 11, 11, 12, 12, 13, 13, 14, 14, 15, 15));
+    }
+}
+
+// The first `unit` bytes (1, 2 or 4) of each of the 8 / `unit` vectors, one behind the other.
+template <uint32_t unit>
+inline Bytes16 join_first(const Bytes16 *vectors) {
+    if constexpr (unit == 1) {
+        Bytes16 pairs[4];
+        for (uint32_t i = 0; i < 4; ++i)
+            pairs[i] = __builtin_shufflevector(vectors[2 * i], vectors[2 * i + 1], 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5,
+                                               21, 6, 22, 7, 23);
+        return join_first<2>(pairs);
+    } else if constexpr (unit == 2) {
+        Bytes16 pairs[2];
+        for (uint32_t i = 0; i < 2; ++i)
+            pairs[i] = std::bit_cast<Bytes16>(__builtin_shufflevector(std::bit_cast<Lanes>(vectors[2 * i]),
+                                                                      std::bit_cast<Lanes>(vectors[2 * i + 1]), 0, 8, 1,
+                                                                      9, 2, 10, 3, 11));
+        return join_first<4>(pairs);
+    } else {
+        return std::bit_cast<Bytes16>(
+            __builtin_shufflevector(std::bit_cast<Words4>(vectors[0]), std::bit_cast<Words4>(vectors[1]), 0, 4, 1, 5));
+    }
+}
+
+inline Lanes least(Lanes a, Lanes b) {
+#if defined(__SSE2__)
+    return std::bit_cast<Lanes>(_mm_min_epi16(std::bit_cast<__m128i>(a), std::bit_cast<__m128i>(b)));
+#else
+    return a < b ? a : b;
+#endif
+}
+
+inline Lanes greatest(Lanes a, Lanes b) {
+#if defined(__SSE2__)
+    return std::bit_cast<Lanes>(_mm_max_epi16(std::bit_cast<__m128i>(a), std::bit_cast<__m128i>(b)));
+#else
+    return a < b ? b : a;
+#endif
+}
+
+// The mean of each pair, halves rounded up.
+inline Bytes16 mean_rounded_up(Bytes16 a, Bytes16 b) {
+#if defined(__SSE2__)
+    return std::bit_cast<Bytes16>(_mm_avg_epu8(std::bit_cast<__m128i>(a), std::bit_cast<__m128i>(b)));
+#elif defined(__ARM_NEON)
+    return std::bit_cast<Bytes16>(vrhaddq_u8(std::bit_cast<uint8x16_t>(a), std::bit_cast<uint8x16_t>(b)));
+#else
+    return (a | b) - ((a ^ b) >> 1);
+#endif
+}
+
+// Numbers from 0 to 255, modulo 256.
+inline Lanes add_low_bytes(Lanes a, Lanes b) {
+    return std::bit_cast<Lanes>(std::bit_cast<Bytes16>(a) + std::bit_cast<Bytes16>(b));
+}
+
+inline Lanes subtract_low_bytes(Lanes a, Lanes b) {
+    return std::bit_cast<Lanes>(std::bit_cast<Bytes16>(a) - std::bit_cast<Bytes16>(b));
 }
 
 } // namespace pelm

@@ -1,0 +1,40 @@
+#include "frame/processor.h"
+
+#include <atomic>
+
+#include "frame/lanes.h"
+
+#if defined(__x86_64__) || defined(__i386__)
+#include <cpuid.h>
+#endif
+
+namespace pelm {
+namespace {
+
+// The library's only variable: 0, or what was found. Whoever finds it 0 asks, and all find the same.
+std::atomic<uint8_t> known_kernels;
+
+Kernels find_kernels() {
+#if defined(__x86_64__) || defined(__i386__)
+    unsigned eax, ebx, ecx, edx;
+    const bool has_answer = __get_cpuid(1, &eax, &ebx, &ecx, &edx) != 0;
+    if (has_answer && (ecx & bit_PCLMUL) != 0 && (ecx & bit_SSE4_1) != 0) return Kernels::carryless;
+#endif
+    return lanes_are_fast ? Kernels::lanes : Kernels::plain;
+}
+
+} // namespace
+
+Kernels kernels() {
+    const uint8_t known = known_kernels.load(std::memory_order_relaxed);
+    if (known != 0) return static_cast<Kernels>(known);
+    const Kernels found = find_kernels();
+    use_kernels(found);
+    return found;
+}
+
+void use_kernels(Kernels wanted) {
+    known_kernels.store(static_cast<uint8_t>(wanted), std::memory_order_relaxed);
+}
+
+} // namespace pelm

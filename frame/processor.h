@@ -1,0 +1,21 @@
+// Which code does the work where there is more than one for it. All of it gives the same bytes.
+#pragma once
+
+#include <cstdint>
+
+namespace pelm {
+
+// Each includes those before it.
+enum class Kernels : uint8_t {
+    plain = 1,
+    lanes,     // frame/lanes.h
+    carryless, // and x86's carry-less multiplication
+};
+
+// What this processor is best served with. It is asked once: asking is slow in a virtual machine.
+Kernels kernels();
+
+// From now on and for all threads; `wanted` is no more than the processor has. For tests.
+void use_kernels(Kernels wanted);
+
+} // namespace pelm

@@ -1,0 +1,259 @@
+#include "png/unfilter_lanes.h"
+
+#include "frame/lanes.h"
+#include "png/unfilter_plain.h"
+
+namespace pelm {
+namespace {
+
+template <uint32_t distance>
+using Distance = std::integral_constant<uint32_t, distance>;
+
+// The truncated mean of a and b is the complement of the rounded mean of their complements. What goes from pixel to
+// pixel is the complement: two operations.
+struct AverageChain {
+    Bytes16 left = ~Bytes16{};
+
+    Bytes16 next(Bytes16 residual, Bytes16 up) {
+        left = mean_rounded_up(left, ~up) - residual;
+        return ~left;
+    }
+};
+
+// With t = 3c - (a + b) the predictor is the lesser of a and b where the greater one is at most t, the greater one
+// where t is at most the lesser, else c. 3c - b and what is added to c wait for no pixel on the left: five operations.
+struct PaethChain {
+    Lanes left{}, up_left{}, three_up_left{};
+
+    Bytes16 next(Bytes16 residual, Bytes16 up_bytes) {
+        const Lanes up = widen(up_bytes);
+        const Lanes sum = add_low_bytes(up_left, widen(residual));
+        const Lanes threshold = three_up_left - up - left;
+        const Lanes less = least(left, up), more = greatest(left, up);
+        const Lanes from_less = ~(more > threshold) & subtract_low_bytes(less, up_left);
+        const Lanes from_more = ~(threshold > less) & subtract_low_bytes(more, up_left);
+        left = add_low_bytes(from_less | from_more, sum); // both at once only where all three are equal
+        up_left = up;
+        three_up_left = up + up + up;
+        return narrow(left);
+    }
+};
+
+// Sums of the vector's own pixels in log steps; the sum of all vectors before it, in every pixel, comes on top.
+template <uint32_t unit>
+struct SubChain {
+    Bytes16 left{};
+
+    static Bytes16 sums(Bytes16 bytes) {
+        bytes += move_up<unit>(bytes);
+        if constexpr (unit <= 4) bytes += move_up<2 * unit>(bytes);
+        if constexpr (unit <= 2) bytes += move_up<4 * unit>(bytes);
+        if constexpr (unit <= 1) bytes += move_up<8 * unit>(bytes);
+        return bytes;
+    }
+
+    // Of the pixels that `sums` adds up.
+    static Bytes16 last_in_every_pixel(Bytes16 bytes) {
+        if constexpr (unit == 3) {
+            Bytes16 last = move_down<13>(move_up<4>(bytes));
+            last |= move_up<3>(last);
+            return last | move_up<6>(last);
+        } else {
+            return last_everywhere<unit>(bytes);
+        }
+    }
+
+    Bytes16 next(Bytes16 residuals) {
+        const Bytes16 own = sums(residuals), result = own + left;
+        left += last_in_every_pixel(own);
+        return result;
+    }
+};
+
+// Goes through whole steps of `step` bytes, loading and storing `wide` of them at once; the surplus belongs to the next
+// step, which is loaded before it is overwritten. Where a row ends exactly the step's bytes are touched. Returns how
+// many bytes are done. `next(residuals, at, count)` gives the bytes for those at `at`; `count` is as for load_bytes.
+template <uint32_t step, uint32_t wide, class Next>
+inline uint32_t undo_in_steps(uint8_t *row, uint32_t length, Next next) {
+    constexpr Distance<step> narrow_count;
+    constexpr Distance<wide> wide_count;
+    uint32_t i = 0;
+    if (length >= step + wide) {
+        Bytes16 residuals = load_bytes<wide>(row);
+        for (; length - i >= step + wide; i += step) {
+            const Bytes16 later = load_bytes<wide>(row + i + step);
+            store_bytes<wide>(row + i, next(residuals, i, wide_count));
+            residuals = later;
+        }
+        store_bytes<step>(row + i, next(residuals, i, narrow_count));
+        i += step;
+    }
+    for (; length - i >= step; i += step)
+        store_bytes<step>(row + i, next(load_bytes<step>(row + i), i, narrow_count));
+    return i;
+}
+
+template <uint32_t unit, class Chain>
+inline uint32_t undo_by_pixels(uint8_t *row, const uint8_t *above, uint32_t length) {
+    constexpr uint32_t wide = unit <= 4 ? 4 : 8;
+    Chain chain;
+    return undo_in_steps<unit, wide>(row, length, [&](Bytes16 residuals, uint32_t at, auto count) {
+        return chain.next(residuals, load_bytes<count>(above + at));
+    });
+}
+
+template <uint32_t unit>
+void undo_sub(uint8_t *row, uint32_t length) {
+    uint32_t done;
+    if constexpr (unit == 6) {
+        Bytes16 left{};
+        done = undo_in_steps<6, 8>(row, length, [&](Bytes16 residuals, uint32_t, auto) { return left += residuals; });
+    } else {
+        SubChain<unit> chain;
+        done = undo_in_steps < unit == 3 ? 12 : 16,
+        16 > (row, length, [&](Bytes16 residuals, uint32_t, auto) { return chain.next(residuals); });
+    }
+    undo_sub_from(done, row, length, Distance<unit>());
+}
+
+void undo_up(uint8_t *row, const uint8_t *above, uint32_t length) {
+    const uint32_t done = undo_in_steps<16, 16>(row, length, [&](Bytes16 residuals, uint32_t at, auto count) {
+        return residuals + load_bytes<count>(above + at);
+    });
+    undo_up_from(done, row, above, length);
+}
+
+// Pixels of one or two bytes: eight bytes at a time, of which the pixel in turn is moved down to the first lanes.
+template <uint32_t unit>
+inline uint32_t undo_average_of_small_pixels(uint8_t *row, const uint8_t *above, uint32_t length) {
+    constexpr uint32_t count = 8 / unit;
+    AverageChain chain;
+    uint32_t i = 0;
+    for (; length - i >= 8; i += 8) {
+        auto residuals = std::bit_cast<Words2>(load_bytes<8>(row + i));
+        auto up = std::bit_cast<Words2>(load_bytes<8>(above + i));
+        Bytes16 pixels[count];
+        for (uint32_t k = 0; k < count; ++k) {
+            pixels[k] = chain.next(std::bit_cast<Bytes16>(residuals), std::bit_cast<Bytes16>(up));
+            residuals >>= 8 * unit;
+            up >>= 8 * unit;
+        }
+        store_bytes<8>(row + i, join_first<unit>(pixels));
+    }
+    return i;
+}
+
+// Without a branch, which would go wrong every other time.
+inline uint32_t choose(bool condition, uint32_t yes, uint32_t no) {
+#if defined(__clang__)
+    return __builtin_unpredictable(condition) ? yes : no;
+#else
+    return __builtin_expect_with_probability(condition, true, 0.5) ? yes : no;
+#endif
+}
+
+// What decides about Paeth's predictor in eight bytes, without the byte on the left. With e = b - c it is a outside of
+// the numbers from b to c - 2e; from b as far as c - e / 2 it is b, and beyond it c.
+struct PaethChoices {
+    int16_t first[8];  // of the numbers for which it is not a; the end that is no such number is left out
+    uint16_t more[8];  // numbers after the first
+    int16_t middle[8]; // from there on it is the greater one of b and c, below it the lesser one
+    uint16_t lesser[8], greater[8];
+
+    PaethChoices(Lanes up, Lanes up_left) {
+        const Lanes step = up - up_left, far = up_left - step - step;
+        const Lanes begin = least(far + 1, up), end = greatest(far - 1, up);
+        store(first, begin);
+        store(more, end - begin);
+        store(middle, up_left - ((step + (step >> 15)) >> 1));
+        store(lesser, least(up, up_left));
+        store(greater, greatest(up, up_left));
+    }
+
+    uint32_t predictor(uint32_t left, uint32_t k) const {
+        const auto a = static_cast<int32_t>(left);
+        const uint32_t b_or_c = choose(a >= middle[k], greater[k], lesser[k]);
+        return choose(static_cast<uint32_t>(a - first[k]) <= more[k], b_or_c, left);
+    }
+
+private:
+    static void store(void *to, Lanes lanes) { std::memcpy(to, &lanes, sizeof(lanes)); }
+};
+
+// Returns the last pixel of the eight bytes. Inlined into a loop this is what compilers make branches of.
+template <class Pixel>
+[[gnu::noinline]] Pixel undo_paeth_of_eight(uint8_t *__restrict row, const PaethChoices &__restrict choices,
+                                            Pixel left) {
+    for (uint32_t k = 0; k < 8; ++k) {
+        uint32_t &channel = left.channels[k % left.count];
+        channel = (row[k] + choices.predictor(channel, k)) & 0xFF;
+        row[k] = static_cast<uint8_t>(channel);
+    }
+    return left;
+}
+
+template <uint32_t unit>
+struct SmallPixel {
+    static constexpr uint32_t count = unit;
+    uint32_t channels[unit]; // which the calling conventions pass in registers
+};
+
+// Pixels of one or two bytes: a number at a time goes faster through the processor's other registers.
+template <uint32_t unit>
+inline uint32_t undo_paeth_of_small_pixels(uint8_t *row, const uint8_t *above, uint32_t length) {
+    SmallPixel<unit> left{};
+    Bytes16 last{};
+    uint32_t i = 0;
+    for (; length - i >= 8; i += 8) {
+        const Bytes16 up = load_bytes<8>(above + i);
+        left = undo_paeth_of_eight(row + i, PaethChoices(widen(up), widen(move_up<unit>(up) | last)), left);
+        last = move_down<8 - unit>(up);
+    }
+    return i;
+}
+
+template <uint32_t unit>
+void undo_average(uint8_t *row, const uint8_t *above, uint32_t length) {
+    uint32_t done;
+    if constexpr (unit <= 2)
+        done = undo_average_of_small_pixels<unit>(row, above, length);
+    else
+        done = undo_by_pixels<unit, AverageChain>(row, above, length);
+    undo_average_from(done, row, above, length, Distance<unit>());
+}
+
+template <uint32_t unit>
+void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length) {
+    uint32_t done;
+    if constexpr (unit <= 2)
+        done = undo_paeth_of_small_pixels<unit>(row, above, length);
+    else
+        done = undo_by_pixels<unit, PaethChain>(row, above, length);
+    undo_paeth_from(done, row, above, length, Distance<unit>());
+}
+
+template <uint32_t unit>
+void undo(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length) {
+    switch (filter) {
+    case FILTER_SUB: return undo_sub<unit>(row, length);
+    case FILTER_UP: return undo_up(row, above, length);
+    case FILTER_AVERAGE: return undo_average<unit>(row, above, length);
+    case FILTER_PAETH: return undo_paeth<unit>(row, above, length);
+    default: return;
+    }
+}
+
+} // namespace
+
+void unfilter_lanes(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, uint32_t distance) {
+    switch (distance) {
+    case 1: return undo<1>(filter, row, above, length);
+    case 2: return undo<2>(filter, row, above, length);
+    case 3: return undo<3>(filter, row, above, length);
+    case 4: return undo<4>(filter, row, above, length);
+    case 6: return undo<6>(filter, row, above, length);
+    default: return undo<8>(filter, row, above, length);
+    }
+}
+
+} // namespace pelm

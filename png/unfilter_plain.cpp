@@ -1,0 +1,62 @@
+#include "png/unfilter_plain.h"
+
+#include <type_traits>
+
+namespace pelm {
+namespace {
+
+// The distance is a template argument where it is one of those that PNG has, so that the row's last pixels stay in
+// registers.
+template <uint32_t distance>
+using Distance = std::integral_constant<uint32_t, distance>;
+
+template <class D>
+void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length, D distance) {
+    undo_paeth_from(0, row, above, length, distance);
+}
+
+// Whole pixels, whose left neighbours stay in registers.
+template <uint32_t distance>
+void undo_paeth(uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length, Distance<distance>) {
+    int32_t left[distance] = {};
+    int32_t above_left[distance] = {};
+    uint32_t i = 0;
+    for (; i + distance <= length; i += distance)
+        for (uint32_t k = 0; k < distance; ++k) {
+            const int32_t up = above[i + k];
+            left[k] = static_cast<uint8_t>(row[i + k] + paeth_predictor(left[k], up, above_left[k]));
+            above_left[k] = up;
+            row[i + k] = static_cast<uint8_t>(left[k]);
+        }
+    undo_paeth_from(i, row, above, length, Distance<distance>());
+}
+
+template <class D>
+void undo(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, D distance) {
+    switch (filter) {
+    case FILTER_NONE: return;
+    case FILTER_SUB: return undo_sub_from(0, row, length, distance);
+    case FILTER_UP: return undo_up_from(0, row, above, length);
+    case FILTER_AVERAGE: return undo_average_from(0, row, above, length, distance);
+    case FILTER_PAETH: return undo_paeth(row, above, length, distance);
+    default:
+        // Required: an unknown filter is no error (docs/oddities.md, "Unknown filters").
+        if (length > 0) row[0] = 0;
+    }
+}
+
+} // namespace
+
+void unfilter_plain(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, uint32_t distance) {
+    switch (distance) {
+    case 1: return undo(filter, row, above, length, Distance<1>());
+    case 2: return undo(filter, row, above, length, Distance<2>());
+    case 3: return undo(filter, row, above, length, Distance<3>());
+    case 4: return undo(filter, row, above, length, Distance<4>());
+    case 6: return undo(filter, row, above, length, Distance<6>());
+    case 8: return undo(filter, row, above, length, Distance<8>());
+    default: return undo(filter, row, above, length, distance);
+    }
+}
+
+} // namespace pelm
