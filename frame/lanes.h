@@ -183,6 +183,18 @@ inline Bytes16 join_first(const Bytes16 *vectors) {
     }
 }
 
+// a - b, which must not overflow. The compilers do not regroup it with other sums, so that it stays the only operation
+// between b and the result.
+inline Lanes subtract_alone(Lanes a, Lanes b) {
+#if defined(__SSE2__)
+    return std::bit_cast<Lanes>(_mm_subs_epi16(std::bit_cast<__m128i>(a), std::bit_cast<__m128i>(b)));
+#elif defined(__ARM_NEON)
+    return std::bit_cast<Lanes>(vqsubq_s16(std::bit_cast<int16x8_t>(a), std::bit_cast<int16x8_t>(b)));
+#else
+    return a - b;
+#endif
+}
+
 inline Lanes least(Lanes a, Lanes b) {
 #if defined(__SSE2__)
     return std::bit_cast<Lanes>(_mm_min_epi16(std::bit_cast<__m128i>(a), std::bit_cast<__m128i>(b)));

@@ -28,7 +28,7 @@ struct PaethChain {
     Bytes16 next(Bytes16 residual, Bytes16 up_bytes) {
         const Lanes up = widen(up_bytes);
         const Lanes sum = add_low_bytes(up_left, widen(residual));
-        const Lanes threshold = three_up_left - up - left;
+        const Lanes threshold = subtract_alone(three_up_left - up, left);
         const Lanes less = least(left, up), more = greatest(left, up);
         const Lanes from_less = ~(more > threshold) & subtract_low_bytes(less, up_left);
         const Lanes from_more = ~(threshold > less) & subtract_low_bytes(more, up_left);
@@ -74,7 +74,7 @@ struct SubChain {
 // step, which is loaded before it is overwritten. Where a row ends exactly the step's bytes are touched. Returns how
 // many bytes are done. `next(residuals, at, count)` gives the bytes for those at `at`; `count` is as for load_bytes.
 template <uint32_t step, uint32_t wide, class Next>
-inline uint32_t undo_in_steps(uint8_t *row, uint32_t length, Next next) {
+[[gnu::always_inline]] inline uint32_t undo_in_steps(uint8_t *row, uint32_t length, Next next) {
     constexpr Distance<step> narrow_count;
     constexpr Distance<wide> wide_count;
     uint32_t i = 0;
@@ -103,24 +103,21 @@ inline uint32_t undo_by_pixels(uint8_t *row, const uint8_t *above, uint32_t leng
 }
 
 template <uint32_t unit>
-void undo_sub(uint8_t *row, uint32_t length) {
-    uint32_t done;
+uint32_t undo_sub(uint8_t *row, uint32_t length) {
     if constexpr (unit == 6) {
         Bytes16 left{};
-        done = undo_in_steps<6, 8>(row, length, [&](Bytes16 residuals, uint32_t, auto) { return left += residuals; });
+        return undo_in_steps<6, 8>(row, length, [&](Bytes16 residuals, uint32_t, auto) { return left += residuals; });
     } else {
         SubChain<unit> chain;
-        done = undo_in_steps < unit == 3 ? 12 : 16,
-        16 > (row, length, [&](Bytes16 residuals, uint32_t, auto) { return chain.next(residuals); });
+        return undo_in_steps < unit == 3 ? 12 : 16,
+               16 > (row, length, [&](Bytes16 residuals, uint32_t, auto) { return chain.next(residuals); });
     }
-    undo_sub_from(done, row, length, Distance<unit>());
 }
 
-void undo_up(uint8_t *row, const uint8_t *above, uint32_t length) {
-    const uint32_t done = undo_in_steps<16, 16>(row, length, [&](Bytes16 residuals, uint32_t at, auto count) {
+uint32_t undo_up(uint8_t *row, const uint8_t *above, uint32_t length) {
+    return undo_in_steps<16, 16>(row, length, [&](Bytes16 residuals, uint32_t at, auto count) {
         return residuals + load_bytes<count>(above + at);
     });
-    undo_up_from(done, row, above, length);
 }
 
 // Pixels of one or two bytes: eight bytes at a time, of which the pixel in turn is moved down to the first lanes.
@@ -184,11 +181,12 @@ private:
 template <class Pixel>
 [[gnu::noinline]] Pixel undo_paeth_of_eight(uint8_t *__restrict row, const PaethChoices &__restrict choices,
                                             Pixel left) {
-    for (uint32_t k = 0; k < 8; ++k) {
-        uint32_t &channel = left.channels[k % left.count];
-        channel = (row[k] + choices.predictor(channel, k)) & 0xFF;
-        row[k] = static_cast<uint8_t>(channel);
-    }
+    for (uint32_t i = 0; i < 8; i += Pixel::count)
+        for (uint32_t k = 0; k < Pixel::count; ++k) {
+            const uint32_t byte = (row[i + k] + choices.predictor(left.channels[k], i + k)) & 0xFF;
+            left.channels[k] = byte;
+            row[i + k] = static_cast<uint8_t>(byte);
+        }
     return left;
 }
 
@@ -212,40 +210,23 @@ inline uint32_t undo_paeth_of_small_pixels(uint8_t *row, const uint8_t *above, u
     return i;
 }
 
+// Returns how many bytes are done; what is left is shorter than a step.
 template <uint32_t unit>
-void undo_average(uint8_t *row, const uint8_t *above, uint32_t length) {
-    uint32_t done;
-    if constexpr (unit <= 2)
-        done = undo_average_of_small_pixels<unit>(row, above, length);
-    else
-        done = undo_by_pixels<unit, AverageChain>(row, above, length);
-    undo_average_from(done, row, above, length, Distance<unit>());
-}
-
-template <uint32_t unit>
-void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length) {
-    uint32_t done;
-    if constexpr (unit <= 2)
-        done = undo_paeth_of_small_pixels<unit>(row, above, length);
-    else
-        done = undo_by_pixels<unit, PaethChain>(row, above, length);
-    undo_paeth_from(done, row, above, length, Distance<unit>());
-}
-
-template <uint32_t unit>
-void undo(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length) {
+uint32_t undo(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length) {
     switch (filter) {
     case FILTER_SUB: return undo_sub<unit>(row, length);
     case FILTER_UP: return undo_up(row, above, length);
-    case FILTER_AVERAGE: return undo_average<unit>(row, above, length);
-    case FILTER_PAETH: return undo_paeth<unit>(row, above, length);
-    default: return;
+    case FILTER_AVERAGE:
+        if constexpr (unit <= 2) return undo_average_of_small_pixels<unit>(row, above, length);
+        return undo_by_pixels<unit, AverageChain>(row, above, length);
+    case FILTER_PAETH:
+        if constexpr (unit <= 2) return undo_paeth_of_small_pixels<unit>(row, above, length);
+        return undo_by_pixels<unit, PaethChain>(row, above, length);
+    default: return length;
     }
 }
 
-} // namespace
-
-void unfilter_lanes(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, uint32_t distance) {
+uint32_t undo(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, uint32_t distance) {
     switch (distance) {
     case 1: return undo<1>(filter, row, above, length);
     case 2: return undo<2>(filter, row, above, length);
@@ -254,6 +235,13 @@ void unfilter_lanes(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t
     case 6: return undo<6>(filter, row, above, length);
     default: return undo<8>(filter, row, above, length);
     }
+}
+
+} // namespace
+
+void unfilter_lanes(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, uint32_t distance) {
+    const uint32_t done = undo(filter, row, above, length, distance);
+    unfilter_plain_from(done, filter, row, above, length, distance);
 }
 
 } // namespace pelm

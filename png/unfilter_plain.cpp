@@ -1,9 +1,53 @@
 #include "png/unfilter_plain.h"
 
+#include <algorithm>
 #include <type_traits>
 
 namespace pelm {
 namespace {
+
+int32_t distance_between(int32_t a, int32_t b) {
+    return a < b ? b - a : a - b;
+}
+
+uint8_t paeth_predictor(int32_t left, int32_t up, int32_t up_left) {
+    const int32_t from_left = distance_between(up, up_left);
+    const int32_t from_up = distance_between(left, up_left);
+    const int32_t from_up_left = distance_between(left + up, 2 * up_left);
+    const int32_t up_or_up_left = from_up <= from_up_left ? up : up_left;
+    return static_cast<uint8_t>(((from_left <= from_up) & (from_left <= from_up_left)) != 0 ? left : up_or_up_left);
+}
+
+template <class D>
+void undo_sub_from(uint32_t i, uint8_t *row, uint32_t length, D distance) {
+    for (i = std::max<uint32_t>(i, distance); i < length; ++i)
+        row[i] = static_cast<uint8_t>(row[i] + row[i - distance]);
+}
+
+void undo_up_from(uint32_t i, uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length) {
+    for (; i < length; ++i)
+        row[i] = static_cast<uint8_t>(row[i] + above[i]);
+}
+
+template <class D>
+void undo_average_from(uint32_t i, uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length,
+                       D distance) {
+    const uint32_t first = std::min<uint32_t>(distance, length);
+    for (; i < first; ++i)
+        row[i] = static_cast<uint8_t>(row[i] + (above[i] >> 1));
+    for (; i < length; ++i)
+        row[i] = static_cast<uint8_t>(row[i] + ((row[i - distance] + above[i]) >> 1));
+}
+
+template <class D>
+void undo_paeth_from(uint32_t i, uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length,
+                     D distance) {
+    const uint32_t first = std::min<uint32_t>(distance, length);
+    for (; i < first; ++i)
+        row[i] = static_cast<uint8_t>(row[i] + above[i]);
+    for (; i < length; ++i)
+        row[i] = static_cast<uint8_t>(row[i] + paeth_predictor(row[i - distance], above[i], above[i - distance]));
+}
 
 // The distance is a template argument where it is one of those that PNG has, so that the row's last pixels stay in
 // registers.
@@ -46,6 +90,18 @@ void undo(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, D
 }
 
 } // namespace
+
+void unfilter_plain_from(uint32_t done, uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length,
+                         uint32_t distance) {
+    if (done == length) return;
+    switch (filter) {
+    case FILTER_SUB: return undo_sub_from(done, row, length, distance);
+    case FILTER_UP: return undo_up_from(done, row, above, length);
+    case FILTER_AVERAGE: return undo_average_from(done, row, above, length, distance);
+    case FILTER_PAETH: return undo_paeth_from(done, row, above, length, distance);
+    default: return;
+    }
+}
 
 void unfilter_plain(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, uint32_t distance) {
     switch (distance) {
