@@ -18,7 +18,7 @@ Kernels find_kernels() {
 #if defined(__x86_64__) || defined(__i386__)
     unsigned eax, ebx, ecx, edx;
     const bool has_answer = __get_cpuid(1, &eax, &ebx, &ecx, &edx) != 0;
-    if (has_answer && (ecx & bit_PCLMUL) != 0 && (ecx & bit_SSE4_1) != 0) return Kernels::carryless;
+    if (has_answer && (ecx & bit_PCLMUL) != 0 && (edx & bit_SSE2) != 0) return Kernels::carryless;
 #endif
     return lanes_are_fast ? Kernels::lanes : Kernels::plain;
 }

@@ -8,7 +8,7 @@ namespace pelm {
 // Each includes those before it.
 enum class Kernels : uint8_t {
     plain = 1,
-    lanes,     // frame/lanes.h
+    lanes,     // frame/lanes.h, where lanes_are_fast
     carryless, // and x86's carry-less multiplication
 };
 

@@ -7,6 +7,7 @@
 
 namespace pelm {
 
+constexpr uint32_t crc32_polynomial = 0xEDB88320; // reflected
 constexpr uint32_t crc32_start = 0xFFFFFFFF;
 
 // Goes on over `length` bytes; the checksum of all bytes so far is the complement.

@@ -181,12 +181,14 @@ private:
 template <class Pixel>
 [[gnu::noinline]] Pixel undo_paeth_of_eight(uint8_t *__restrict row, const PaethChoices &__restrict choices,
                                             Pixel left) {
-    for (uint32_t i = 0; i < 8; i += Pixel::count)
-        for (uint32_t k = 0; k < Pixel::count; ++k) {
-            const uint32_t byte = (row[i + k] + choices.predictor(left.channels[k], i + k)) & 0xFF;
-            left.channels[k] = byte;
-            row[i + k] = static_cast<uint8_t>(byte);
-        }
+    const auto undo_byte = [&](uint32_t &channel, uint32_t k) {
+        channel = (row[k] + choices.predictor(channel, k)) & 0xFF;
+        row[k] = static_cast<uint8_t>(channel);
+    };
+    for (uint32_t i = 0; i < 8; i += Pixel::count) {
+        undo_byte(left.channels[0], i);
+        if constexpr (Pixel::count == 2) undo_byte(left.channels[1], i + 1);
+    }
     return left;
 }
 
