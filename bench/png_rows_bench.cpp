@@ -9,6 +9,7 @@
 
 #include "png/crc32.h"
 #include "png/unfilter.h"
+#include "png/unfilter_two_rows.h"
 
 namespace bench {
 namespace {
@@ -42,6 +43,23 @@ void undo_filter(benchmark::State &state, uint8_t filter, uint8_t unit) {
     count_pixels(state, pixels);
 }
 
+void undo_two_filters(benchmark::State &state, uint8_t first_filter, uint8_t second_filter, uint8_t unit) {
+    std::vector<uint8_t> first = noise(size_t{pixels} * unit, 1), second = noise(size_t{pixels} * unit, 2);
+    const std::vector<uint8_t> above = noise(size_t{pixels} * unit, 3);
+    const pelm::TwoRows rows = {.first = first.data(),
+                                .second = second.data(),
+                                .above = above.data(),
+                                .length = pixels * unit,
+                                .distance = unit,
+                                .first_filter = first_filter,
+                                .second_filter = second_filter};
+    for (auto _ : state) {
+        pelm::unfilter_two_rows(rows);
+        benchmark::ClobberMemory();
+    }
+    count_pixels(state, 2 * pixels);
+}
+
 void checksum(benchmark::State &state, uint32_t length) {
     const std::vector<uint8_t> bytes = noise(length, 3);
     uint32_t crc = pelm::crc32_start;
@@ -59,6 +77,13 @@ void add_png_row_benchmarks() {
             const std::string name = std::string("unfilter/") + names[filter] + "/" + std::to_string(unit);
             benchmark::RegisterBenchmark(name.c_str(), undo_filter, filter, static_cast<uint8_t>(unit));
         }
+    for (uint8_t first = 3; first <= 4; ++first)
+        for (uint8_t second = 3; second <= 4; ++second)
+            for (const int unit : {3, 4, 6, 8}) {
+                const std::string filters = std::string(names[first]) + "+" + names[second];
+                const std::string name = "two rows/" + filters + "/" + std::to_string(unit);
+                benchmark::RegisterBenchmark(name.c_str(), undo_two_filters, first, second, static_cast<uint8_t>(unit));
+            }
     for (const uint32_t length : {17u, 64u, 1000u, 8192u, 65536u})
         benchmark::RegisterBenchmark(("crc32/" + std::to_string(length)).c_str(), checksum, length);
 }

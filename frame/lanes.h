@@ -15,15 +15,16 @@
 
 namespace pelm {
 
-// Where the processor lacks vectors the compilers take the lanes apart, and the plain form is the faster one.
+// Where the processor that is compiled for lacks vectors the compilers take the lanes apart, and the plain form is the
+// faster one: there is nothing here then.
 #if defined(__SSE2__) || defined(__ARM_NEON)
+#define PELM_HAS_LANES
 constexpr bool lanes_are_fast = true;
 #else
 constexpr bool lanes_are_fast = false;
 #endif
 
-// All of it is inlined: no call passes lanes, whatever the platform's convention for them.
-#pragma GCC diagnostic ignored "-Wpsabi"
+#ifdef PELM_HAS_LANES
 
 using Bytes16 = uint8_t __attribute__((vector_size(16)));
 using Lanes = int16_t __attribute__((vector_size(16)));
@@ -91,13 +92,8 @@ template <uint32_t count>
 inline Bytes16 move_up(Bytes16 bytes) {
 #if defined(__SSE2__)
     return std::bit_cast<Bytes16>(_mm_slli_si128(std::bit_cast<__m128i>(bytes), count));
-#elif defined(__ARM_NEON)
-    return std::bit_cast<Bytes16>(vextq_u8(vdupq_n_u8(0), std::bit_cast<uint8x16_t>(bytes), 16 - count));
 #else
-    Bytes16 moved{};
-    for (uint32_t i = count; i < 16; ++i)
-        moved[i] = bytes[i - count];
-    return moved;
+    return std::bit_cast<Bytes16>(vextq_u8(vdupq_n_u8(0), std::bit_cast<uint8x16_t>(bytes), 16 - count));
 #endif
 }
 
@@ -105,13 +101,8 @@ template <uint32_t count>
 inline Bytes16 move_down(Bytes16 bytes) {
 #if defined(__SSE2__)
     return std::bit_cast<Bytes16>(_mm_srli_si128(std::bit_cast<__m128i>(bytes), count));
-#elif defined(__ARM_NEON)
-    return std::bit_cast<Bytes16>(vextq_u8(std::bit_cast<uint8x16_t>(bytes), vdupq_n_u8(0), count));
 #else
-    Bytes16 moved{};
-    for (uint32_t i = count; i < 16; ++i)
-        moved[i - count] = bytes[i];
-    return moved;
+    return std::bit_cast<Bytes16>(vextq_u8(std::bit_cast<uint8x16_t>(bytes), vdupq_n_u8(0), count));
 #endif
 }
 
@@ -119,13 +110,8 @@ inline Bytes16 move_down(Bytes16 bytes) {
 inline Lanes widen(Bytes16 bytes) {
 #if defined(__SSE2__)
     return std::bit_cast<Lanes>(_mm_unpacklo_epi8(std::bit_cast<__m128i>(bytes), _mm_setzero_si128()));
-#elif defined(__ARM_NEON)
-    return std::bit_cast<Lanes>(vmovl_u8(vget_low_u8(std::bit_cast<uint8x16_t>(bytes))));
 #else
-    Lanes lanes{};
-    for (uint32_t i = 0; i < 8; ++i)
-        lanes[i] = bytes[i];
-    return lanes;
+    return std::bit_cast<Lanes>(vmovl_u8(vget_low_u8(std::bit_cast<uint8x16_t>(bytes))));
 #endif
 }
 
@@ -133,13 +119,8 @@ inline Lanes widen(Bytes16 bytes) {
 inline Bytes16 narrow(Lanes lanes) {
 #if defined(__SSE2__)
     return std::bit_cast<Bytes16>(_mm_packus_epi16(std::bit_cast<__m128i>(lanes), _mm_setzero_si128()));
-#elif defined(__ARM_NEON)
-    return std::bit_cast<Bytes16>(vcombine_u8(vmovn_u16(std::bit_cast<uint16x8_t>(lanes)), vdup_n_u8(0)));
 #else
-    Bytes16 bytes{};
-    for (uint32_t i = 0; i < 8; ++i)
-        bytes[i] = static_cast<uint8_t>(lanes[i]);
-    return bytes;
+    return std::bit_cast<Bytes16>(vcombine_u8(vmovn_u16(std::bit_cast<uint16x8_t>(lanes)), vdup_n_u8(0)));
 #endif
 }
 
@@ -161,25 +142,33 @@ inline Bytes16 last_everywhere(Bytes16 bytes) {
     }
 }
 
+// Words of `unit` bytes (1, 2, 4 or 8) of the two first halves in turn.
+template <uint32_t unit, class Vector>
+inline Vector join_words(Vector a, Vector b) {
+    if constexpr (unit == 1) {
+        return std::bit_cast<Vector>(__builtin_shufflevector(std::bit_cast<Bytes16>(a), std::bit_cast<Bytes16>(b), 0,
+                                                             16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23));
+    } else if constexpr (unit == 2) {
+        return std::bit_cast<Vector>(
+            __builtin_shufflevector(std::bit_cast<Lanes>(a), std::bit_cast<Lanes>(b), 0, 8, 1, 9, 2, 10, 3, 11));
+    } else if constexpr (unit == 4) {
+        return std::bit_cast<Vector>(
+            __builtin_shufflevector(std::bit_cast<Words4>(a), std::bit_cast<Words4>(b), 0, 4, 1, 5));
+    } else {
+        return std::bit_cast<Vector>(__builtin_shufflevector(std::bit_cast<Words2>(a), std::bit_cast<Words2>(b), 0, 2));
+    }
+}
+
 // The first `unit` bytes (1, 2 or 4) of each of the 8 / `unit` vectors, one behind the other.
 template <uint32_t unit>
 inline Bytes16 join_first(const Bytes16 *vectors) {
-    if constexpr (unit == 1) {
-        Bytes16 pairs[4];
-        for (uint32_t i = 0; i < 4; ++i)
-            pairs[i] = __builtin_shufflevector(vectors[2 * i], vectors[2 * i + 1], 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5,
-                                               21, 6, 22, 7, 23);
-        return join_first<2>(pairs);
-    } else if constexpr (unit == 2) {
-        Bytes16 pairs[2];
-        for (uint32_t i = 0; i < 2; ++i)
-            pairs[i] = std::bit_cast<Bytes16>(__builtin_shufflevector(std::bit_cast<Lanes>(vectors[2 * i]),
-                                                                      std::bit_cast<Lanes>(vectors[2 * i + 1]), 0, 8, 1,
-                                                                      9, 2, 10, 3, 11));
-        return join_first<4>(pairs);
+    if constexpr (unit == 4) {
+        return join_words<4>(vectors[0], vectors[1]);
     } else {
-        return std::bit_cast<Bytes16>(
-            __builtin_shufflevector(std::bit_cast<Words4>(vectors[0]), std::bit_cast<Words4>(vectors[1]), 0, 4, 1, 5));
+        Bytes16 joined[4 / unit];
+        for (uint32_t i = 0; i < 4 / unit; ++i)
+            joined[i] = join_words<unit>(vectors[2 * i], vectors[2 * i + 1]);
+        return join_first<2 * unit>(joined);
     }
 }
 
@@ -188,10 +177,8 @@ inline Bytes16 join_first(const Bytes16 *vectors) {
 inline Lanes subtract_alone(Lanes a, Lanes b) {
 #if defined(__SSE2__)
     return std::bit_cast<Lanes>(_mm_subs_epi16(std::bit_cast<__m128i>(a), std::bit_cast<__m128i>(b)));
-#elif defined(__ARM_NEON)
-    return std::bit_cast<Lanes>(vqsubq_s16(std::bit_cast<int16x8_t>(a), std::bit_cast<int16x8_t>(b)));
 #else
-    return a - b;
+    return std::bit_cast<Lanes>(vqsubq_s16(std::bit_cast<int16x8_t>(a), std::bit_cast<int16x8_t>(b)));
 #endif
 }
 
@@ -215,10 +202,8 @@ inline Lanes greatest(Lanes a, Lanes b) {
 inline Bytes16 mean_rounded_up(Bytes16 a, Bytes16 b) {
 #if defined(__SSE2__)
     return std::bit_cast<Bytes16>(_mm_avg_epu8(std::bit_cast<__m128i>(a), std::bit_cast<__m128i>(b)));
-#elif defined(__ARM_NEON)
-    return std::bit_cast<Bytes16>(vrhaddq_u8(std::bit_cast<uint8x16_t>(a), std::bit_cast<uint8x16_t>(b)));
 #else
-    return (a | b) - ((a ^ b) >> 1);
+    return std::bit_cast<Bytes16>(vrhaddq_u8(std::bit_cast<uint8x16_t>(a), std::bit_cast<uint8x16_t>(b)));
 #endif
 }
 
@@ -230,5 +215,7 @@ inline Lanes add_low_bytes(Lanes a, Lanes b) {
 inline Lanes subtract_low_bytes(Lanes a, Lanes b) {
     return std::bit_cast<Lanes>(std::bit_cast<Bytes16>(a) - std::bit_cast<Bytes16>(b));
 }
+
+#endif
 
 } // namespace pelm

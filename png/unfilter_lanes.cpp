@@ -1,43 +1,15 @@
 #include "png/unfilter_lanes.h"
 
-#include "frame/lanes.h"
+#include "png/unfilter_chains.h"
 #include "png/unfilter_plain.h"
 
 namespace pelm {
+
+#ifdef PELM_HAS_LANES
 namespace {
 
 template <uint32_t distance>
 using Distance = std::integral_constant<uint32_t, distance>;
-
-// The truncated mean of a and b is the complement of the rounded mean of their complements. What goes from pixel to
-// pixel is the complement: two operations.
-struct AverageChain {
-    Bytes16 left = ~Bytes16{};
-
-    Bytes16 next(Bytes16 residual, Bytes16 up) {
-        left = mean_rounded_up(left, ~up) - residual;
-        return ~left;
-    }
-};
-
-// With t = 3c - (a + b) the predictor is the lesser of a and b where the greater one is at most t, the greater one
-// where t is at most the lesser, else c. 3c - b and what is added to c wait for no pixel on the left: five operations.
-struct PaethChain {
-    Lanes left{}, up_left{}, three_up_left{};
-
-    Bytes16 next(Bytes16 residual, Bytes16 up_bytes) {
-        const Lanes up = widen(up_bytes);
-        const Lanes sum = add_low_bytes(up_left, widen(residual));
-        const Lanes threshold = subtract_alone(three_up_left - up, left);
-        const Lanes less = least(left, up), more = greatest(left, up);
-        const Lanes from_less = ~(more > threshold) & subtract_low_bytes(less, up_left);
-        const Lanes from_more = ~(threshold > less) & subtract_low_bytes(more, up_left);
-        left = add_low_bytes(from_less | from_more, sum); // both at once only where all three are equal
-        up_left = up;
-        three_up_left = up + up + up;
-        return narrow(left);
-    }
-};
 
 // Sums of the vector's own pixels in log steps; the sum of all vectors before it, in every pixel, comes on top.
 template <uint32_t unit>
@@ -245,5 +217,13 @@ void unfilter_lanes(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t
     const uint32_t done = undo(filter, row, above, length, distance);
     unfilter_plain_from(done, filter, row, above, length, distance);
 }
+
+#else
+
+void unfilter_lanes(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t length, uint32_t distance) {
+    unfilter_plain(filter, row, above, length, distance);
+}
+
+#endif
 
 } // namespace pelm
