@@ -43,6 +43,20 @@ void undo_filter(benchmark::State &state, uint8_t filter, uint8_t unit) {
     count_pixels(state, pixels);
 }
 
+// All of it one colour.
+void undo_paeth_of_flat_row(benchmark::State &state, uint8_t unit) {
+    std::vector<uint8_t> row(size_t{pixels} * unit + 1);
+    const std::vector<uint8_t> above(size_t{pixels} * unit);
+    row[0] = 4;
+    PngDecodeState decode{};
+    decode.bytesPerPixel = unit;
+    for (auto _ : state) {
+        __PELMI_PngReadFilterRow(&decode, row.data() + 1, above.data(), pixels * unit);
+        benchmark::ClobberMemory();
+    }
+    count_pixels(state, pixels);
+}
+
 void undo_two_filters(benchmark::State &state, uint8_t first_filter, uint8_t second_filter, uint8_t unit) {
     std::vector<uint8_t> first = noise(size_t{pixels} * unit, 1), second = noise(size_t{pixels} * unit, 2);
     const std::vector<uint8_t> above = noise(size_t{pixels} * unit, 3);
@@ -77,6 +91,10 @@ void add_png_row_benchmarks() {
             const std::string name = std::string("unfilter/") + names[filter] + "/" + std::to_string(unit);
             benchmark::RegisterBenchmark(name.c_str(), undo_filter, filter, static_cast<uint8_t>(unit));
         }
+    for (const int unit : {1, 2, 3, 4, 6, 8}) {
+        const std::string name = "unfilter/paeth of a flat row/" + std::to_string(unit);
+        benchmark::RegisterBenchmark(name.c_str(), undo_paeth_of_flat_row, static_cast<uint8_t>(unit));
+    }
     for (uint8_t first = 3; first <= 4; ++first)
         for (uint8_t second = 3; second <= 4; ++second)
             for (const int unit : {3, 4, 6, 8}) {

@@ -1,5 +1,6 @@
 #include "png/unfilter_lanes.h"
 
+#include "png/flat_runs.h"
 #include "png/unfilter_chains.h"
 #include "png/unfilter_plain.h"
 
@@ -66,9 +67,9 @@ template <uint32_t step, uint32_t wide, class Next>
 }
 
 template <uint32_t unit, class Chain>
-inline uint32_t undo_by_pixels(uint8_t *row, const uint8_t *above, uint32_t length) {
+[[gnu::always_inline]] inline uint32_t undo_by_pixels(Chain &chain, uint8_t *row, const uint8_t *above,
+                                                      uint32_t length) {
     constexpr uint32_t wide = unit <= 4 ? 4 : 8;
-    Chain chain;
     return undo_in_steps<unit, wide>(row, length, [&](Bytes16 residuals, uint32_t at, auto count) {
         return chain.next(residuals, load_bytes<count>(above + at));
     });
@@ -172,16 +173,59 @@ struct SmallPixel {
 
 // Pixels of one or two bytes: a number at a time goes faster through the processor's other registers.
 template <uint32_t unit>
-inline uint32_t undo_paeth_of_small_pixels(uint8_t *row, const uint8_t *above, uint32_t length) {
+struct SmallPaethChain {
     SmallPixel<unit> left{};
-    Bytes16 last{};
-    uint32_t i = 0;
-    for (; length - i >= 8; i += 8) {
-        const Bytes16 up = load_bytes<8>(above + i);
-        left = undo_paeth_of_eight(row + i, PaethChoices(widen(up), widen(move_up<unit>(up) | last)), left);
-        last = move_down<8 - unit>(up);
+    Bytes16 last_up{};
+
+    uint32_t undo(uint8_t *row, const uint8_t *above, uint32_t length) {
+        uint32_t i = 0;
+        for (; length - i >= 8; i += 8) {
+            const Bytes16 up = load_bytes<8>(above + i);
+            const PaethChoices choices(widen(up), widen(move_up<unit>(up) | last_up));
+            left = undo_paeth_of_eight(row + i, choices, left);
+            last_up = move_down<8 - unit>(up);
+        }
+        return i;
     }
-    return i;
+
+    Bytes16 left_pixel() const {
+        Bytes16 pixel{};
+        for (uint32_t i = 0; i < unit; ++i)
+            pixel[i] = static_cast<uint8_t>(left.channels[i]);
+        return pixel;
+    }
+};
+
+template <uint32_t unit>
+struct LargePaethChain {
+    PaethChain chain;
+
+    uint32_t undo(uint8_t *row, const uint8_t *above, uint32_t length) {
+        return undo_by_pixels<unit>(chain, row, above, length);
+    }
+
+    Bytes16 left_pixel() const { return narrow(chain.lanes.left); }
+};
+
+// What goes from pixel to pixel stays as it is in a flat run.
+template <uint32_t unit, class Chain>
+uint32_t undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length) {
+    using Runs = FlatRuns<unit>;
+    Chain chain;
+    if (!Runs::are_common(row, above, length)) return chain.undo(row, above, length);
+    uint32_t i = chain.undo(row, above, Runs::length);
+    for (; length - i >= Runs::length; i += Runs::length)
+        if (Runs::is_flat(row + i, above + i))
+            Runs::fill(row + i, chain.left_pixel());
+        else
+            chain.undo(row + i, above + i, Runs::length);
+    return i + chain.undo(row + i, above + i, length - i);
+}
+
+template <uint32_t unit>
+uint32_t undo_average(uint8_t *row, const uint8_t *above, uint32_t length) {
+    AverageChain chain;
+    return undo_by_pixels<unit>(chain, row, above, length);
 }
 
 // Returns how many bytes are done; what is left is shorter than a step.
@@ -192,10 +236,10 @@ uint32_t undo(uint8_t filter, uint8_t *row, const uint8_t *above, uint32_t lengt
     case FILTER_UP: return undo_up(row, above, length);
     case FILTER_AVERAGE:
         if constexpr (unit <= 2) return undo_average_of_small_pixels<unit>(row, above, length);
-        return undo_by_pixels<unit, AverageChain>(row, above, length);
+        return undo_average<unit>(row, above, length);
     case FILTER_PAETH:
-        if constexpr (unit <= 2) return undo_paeth_of_small_pixels<unit>(row, above, length);
-        return undo_by_pixels<unit, PaethChain>(row, above, length);
+        if constexpr (unit <= 2) return undo_paeth<unit, SmallPaethChain<unit>>(row, above, length);
+        return undo_paeth<unit, LargePaethChain<unit>>(row, above, length);
     default: return length;
     }
 }
