@@ -50,10 +50,11 @@ template <uint32_t step, uint32_t wide, class Next>
 [[gnu::always_inline]] inline uint32_t undo_in_steps(uint8_t *row, uint32_t length, Next next) {
     constexpr Distance<step> narrow_count;
     constexpr Distance<wide> wide_count;
-    uint32_t i = 0;
+    size_t i = 0;
     if (length >= step + wide) {
+        const size_t last_wide = length - (step + wide);
         Bytes16 residuals = load_bytes<wide>(row);
-        for (; length - i >= step + wide; i += step) {
+        for (; i <= last_wide; i += step) {
             const Bytes16 later = load_bytes<wide>(row + i + step);
             store_bytes<wide>(row + i, next(residuals, i, wide_count));
             residuals = later;
@@ -63,14 +64,14 @@ template <uint32_t step, uint32_t wide, class Next>
     }
     for (; length - i >= step; i += step)
         store_bytes<step>(row + i, next(load_bytes<step>(row + i), i, narrow_count));
-    return i;
+    return static_cast<uint32_t>(i);
 }
 
 template <uint32_t unit, class Chain>
 [[gnu::always_inline]] inline uint32_t undo_by_pixels(Chain &chain, uint8_t *row, const uint8_t *above,
                                                       uint32_t length) {
     constexpr uint32_t wide = unit <= 4 ? 4 : 8;
-    return undo_in_steps<unit, wide>(row, length, [&](Bytes16 residuals, uint32_t at, auto count) {
+    return undo_in_steps<unit, wide>(row, length, [&](Bytes16 residuals, size_t at, auto count) {
         return chain.next(residuals, load_bytes<count>(above + at));
     });
 }
@@ -79,16 +80,16 @@ template <uint32_t unit>
 uint32_t undo_sub(uint8_t *row, uint32_t length) {
     if constexpr (unit == 6) {
         Bytes16 left{};
-        return undo_in_steps<6, 8>(row, length, [&](Bytes16 residuals, uint32_t, auto) { return left += residuals; });
+        return undo_in_steps<6, 8>(row, length, [&](Bytes16 residuals, size_t, auto) { return left += residuals; });
     } else {
         SubChain<unit> chain;
         return undo_in_steps < unit == 3 ? 12 : 16,
-               16 > (row, length, [&](Bytes16 residuals, uint32_t, auto) { return chain.next(residuals); });
+               16 > (row, length, [&](Bytes16 residuals, size_t, auto) { return chain.next(residuals); });
     }
 }
 
 uint32_t undo_up(uint8_t *row, const uint8_t *above, uint32_t length) {
-    return undo_in_steps<16, 16>(row, length, [&](Bytes16 residuals, uint32_t at, auto count) {
+    return undo_in_steps<16, 16>(row, length, [&](Bytes16 residuals, size_t at, auto count) {
         return residuals + load_bytes<count>(above + at);
     });
 }
@@ -189,10 +190,9 @@ struct SmallPaethChain {
     }
 
     Bytes16 left_pixel() const {
-        Bytes16 pixel{};
-        for (uint32_t i = 0; i < unit; ++i)
-            pixel[i] = static_cast<uint8_t>(left.channels[i]);
-        return pixel;
+        uint32_t pixel = left.channels[0];
+        if constexpr (unit == 2) pixel |= left.channels[1] << 8;
+        return std::bit_cast<Bytes16>(Words4{pixel, 0, 0, 0});
     }
 };
 

@@ -1,24 +1,11 @@
 #include "png/unfilter_two_rows.h"
 
 #include "frame/processor.h"
+#include "png/flat_runs.h"
 #include "png/unfilter_chains.h"
 #include "png/unfilter_plain.h"
 
 namespace pelm {
-namespace {
-
-bool is_chain(uint8_t filter) {
-    return filter == FILTER_AVERAGE || filter == FILTER_PAETH;
-}
-
-} // namespace
-
-bool two_rows_pay(uint8_t first_filter, uint8_t second_filter, uint32_t distance) {
-    const bool has_loop = distance == 3 || distance == 4 || distance == 6 || distance == 8;
-    return lanes_are_fast && has_loop && is_chain(first_filter) && is_chain(second_filter) &&
-           kernels() >= Kernels::lanes;
-}
-
 #ifdef PELM_HAS_LANES
 namespace {
 
@@ -59,22 +46,21 @@ template <uint32_t unit, class Chain>
 class Run {
 public:
     explicit Run(const TwoRows &rows) : first_(rows.first), second_(rows.second), above_(rows.above) {
-        const uint32_t count = rows.length / unit;
-        if (count == 0) return;
+        const size_t end = rows.length - rows.length % unit;
+        if (end == 0) return;
         residuals_.first = load_bytes<unit>(first_);
-        step_at_end(0, count);
-        uint32_t i = 1;
-        for (; (i + 1) * unit + wide <= rows.length; ++i)
-            step(i);
-        for (; i <= count; ++i)
-            step_at_end(i, count);
+        step_at_end(0, end);
+        size_t at = unit;
+        for (; at + unit + wide <= end; at += unit)
+            step(at);
+        for (; at <= end; at += unit)
+            step_at_end(at, end);
     }
 
 private:
     static constexpr uint32_t wide = unit <= 4 ? 4 : 8;
 
-    void step(uint32_t i) {
-        const size_t at = size_t{i} * unit;
+    [[gnu::always_inline]] void step(size_t at) {
         const TwoPixels later = {load_bytes<wide>(first_ + at + unit), load_bytes<wide>(second_ + at)};
         const TwoPixels pixels = chain_.next(residuals_, load_bytes<wide>(above_ + at));
         store_bytes<wide>(first_ + at, pixels.first);
@@ -82,15 +68,14 @@ private:
         residuals_ = later;
     }
 
-    // The first row has `count` pixels; the second one is complete a step later.
-    void step_at_end(uint32_t i, uint32_t count) {
-        const size_t at = size_t{i} * unit;
+    // The first row ends at `end`; the second one is complete a step later.
+    void step_at_end(size_t at, size_t end) {
         TwoPixels later{};
-        if (i + 1 < count) later.first = load_bytes<unit>(first_ + at + unit);
-        if (i < count) later.second = load_bytes<unit>(second_ + at);
-        const TwoPixels pixels = chain_.next(residuals_, i < count ? load_bytes<unit>(above_ + at) : Bytes16{});
-        if (i < count) store_bytes<unit>(first_ + at, pixels.first);
-        if (i > 0) store_bytes<unit>(second_ + at - unit, pixels.second);
+        if (at + unit < end) later.first = load_bytes<unit>(first_ + at + unit);
+        if (at < end) later.second = load_bytes<unit>(second_ + at);
+        const TwoPixels pixels = chain_.next(residuals_, at < end ? load_bytes<unit>(above_ + at) : Bytes16{});
+        if (at < end) store_bytes<unit>(first_ + at, pixels.first);
+        if (at > 0) store_bytes<unit>(second_ + at - unit, pixels.second);
         residuals_ = later;
     }
 
@@ -114,7 +99,27 @@ void undo(const TwoRows &rows) {
         Run<unit, TwoChains<AverageChain, AverageChain>>{rows};
 }
 
+bool is_chain(uint8_t filter) {
+    return filter == FILTER_AVERAGE || filter == FILTER_PAETH;
+}
+
+template <uint32_t unit>
+bool is_flat(const TwoRows &rows) {
+    return rows.first_filter == FILTER_PAETH && FlatRuns<unit>::are_common(rows.first, rows.above, rows.length);
+}
+
 } // namespace
+
+bool two_rows_pay(const TwoRows &rows) {
+    if (!is_chain(rows.first_filter) || !is_chain(rows.second_filter) || kernels() < Kernels::lanes) return false;
+    switch (rows.distance) {
+    case 3: return !is_flat<3>(rows);
+    case 4: return !is_flat<4>(rows);
+    case 6: return !is_flat<6>(rows);
+    case 8: return !is_flat<8>(rows);
+    default: return false;
+    }
+}
 
 void unfilter_two_rows(const TwoRows &rows) {
     switch (rows.distance) {
@@ -129,6 +134,10 @@ void unfilter_two_rows(const TwoRows &rows) {
 }
 
 #else
+
+bool two_rows_pay(const TwoRows &) {
+    return false;
+}
 
 void unfilter_two_rows(const TwoRows &rows) {
     unfilter_plain(rows.first_filter, rows.first, rows.above, rows.length, rows.distance);

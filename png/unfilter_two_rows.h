@@ -17,8 +17,9 @@ struct TwoRows {
     uint8_t second_filter;
 };
 
-// Whether it is faster than a row after the other: Average and Paeth, in any order, for pixels of three bytes and more.
-bool two_rows_pay(uint8_t first_filter, uint8_t second_filter, uint32_t distance);
+// Whether it is faster than a row after the other: Average and Paeth, in any order, for pixels of three bytes and more,
+// unless a first Paeth row is flat in many places, which a row alone makes use of. Both rows are as they were filtered.
+bool two_rows_pay(const TwoRows &rows);
 
 // The first row below `above` and the second one below the first, in place, where two_rows_pay. Nothing outside the
 // three rows is read or written. They do not overlap.

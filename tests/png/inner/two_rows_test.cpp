@@ -68,16 +68,37 @@ TEST(UnfilterTwoRows, give_what_one_row_after_the_other_gives) {
 }
 
 TEST(UnfilterTwoRows, pay_for_average_and_paeth_of_large_pixels) {
-    for (uint32_t distance = 1; distance <= 9; ++distance)
-        for (uint8_t first = 0; first <= 6; ++first)
-            for (uint8_t second = 0; second <= 6; ++second) {
-                const bool is_large = distance == 3 || distance == 4 || distance == 6 || distance == 8;
-                const bool are_chains = first >= 3 && first <= 4 && second >= 3 && second <= 4;
-                EXPECT_EQ(two_rows_pay(first, second, distance), lanes_are_fast && is_large && are_chains)
-                    << "filters " << int{first} << " and " << int{second} << ", distance " << distance;
+    Bytes first = noise_bytes(3000, 1), second = noise_bytes(3000, 2);
+    const Bytes above = noise_bytes(3000, 3);
+    TwoRows rows = {first.data(), second.data(), above.data(), 3000, 0, 0, 0};
+    for (rows.distance = 1; rows.distance <= 9; ++rows.distance)
+        for (rows.first_filter = 0; rows.first_filter <= 6; ++rows.first_filter)
+            for (rows.second_filter = 0; rows.second_filter <= 6; ++rows.second_filter) {
+                const bool is_large =
+                    rows.distance == 3 || rows.distance == 4 || rows.distance == 6 || rows.distance == 8;
+                const bool are_chains = rows.first_filter >= 3 && rows.first_filter <= 4 && rows.second_filter >= 3 &&
+                                        rows.second_filter <= 4;
+                EXPECT_EQ(two_rows_pay(rows), lanes_are_fast && is_large && are_chains)
+                    << "filters " << int{rows.first_filter} << " and " << int{rows.second_filter} << ", distance "
+                    << rows.distance;
             }
+    rows.distance = 4;
+    rows.first_filter = rows.second_filter = FILTER_PAETH;
     const WithKernels with(Kernels::plain);
-    EXPECT_FALSE(two_rows_pay(FILTER_PAETH, FILTER_PAETH, 4));
+    EXPECT_FALSE(two_rows_pay(rows));
+}
+
+TEST(UnfilterTwoRows, do_not_pay_where_the_first_one_is_flat) {
+    Bytes first(3000), second(3000);
+    const Bytes above(3000, 77);
+    TwoRows rows = {first.data(), second.data(), above.data(), 3000, 0, FILTER_PAETH, FILTER_PAETH};
+    for (const uint8_t distance : std::initializer_list<uint8_t>{3, 4, 6, 8}) {
+        rows.distance = distance;
+        rows.first_filter = FILTER_PAETH;
+        EXPECT_FALSE(two_rows_pay(rows)) << int{distance};
+        rows.first_filter = FILTER_AVERAGE;
+        EXPECT_EQ(two_rows_pay(rows), lanes_are_fast) << int{distance};
+    }
 }
 
 } // namespace pelm::test
