@@ -6,7 +6,9 @@
 #include "png/unfilter_plain.h"
 
 namespace pelm {
+
 #ifdef PELM_HAS_LANES
+
 namespace {
 
 struct TwoPixels {
