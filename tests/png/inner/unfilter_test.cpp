@@ -7,6 +7,7 @@
 #include "tests/png/support/png_builder.h"
 #include "tests/support/guarded_buffer.h"
 #include "tests/support/kernels.h"
+#include "tests/sweeps/extent.h"
 
 namespace pelm::test {
 
@@ -188,14 +189,15 @@ TEST(Unfilter, the_average_keeps_the_carry_of_its_sum) {
 
 // Below bytes c and b in turn lie all bytes a and the one after each: every second predictor sees a, b and c.
 TEST(Unfilter, the_paeth_predictor_is_right_for_all_neighbours) {
+    const auto b_step = sweeps::by_extent(17u, 5u, 1u), c_step = sweeps::by_extent(15u, 3u, 1u);
     for (const uint32_t distance : distances) {
         PngDecodeState state{};
         state.bytesPerPixel = static_cast<uint8_t>(distance);
         Bytes row(512 * distance), above(512 * distance);
         for (size_t i = 0; i < row.size(); ++i)
             row[i] = static_cast<uint8_t>(i / distance % 2 == 0 ? i / distance / 2 : i * 37);
-        for (uint32_t b = 0; b < 256; b += 5)
-            for (uint32_t c = 0; c < 256; c += 3) {
+        for (uint32_t b = 0; b < 256; b += b_step)
+            for (uint32_t c = 0; c < 256; c += c_step) {
                 for (size_t i = 0; i < above.size(); ++i)
                     above[i] = static_cast<uint8_t>(i / distance % 2 == 0 ? c : b);
                 const Bytes filtered = filtered_row(4, row, above, distance);
