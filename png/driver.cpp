@@ -129,7 +129,7 @@ uint32_t PELMI_DestroyDecodePng(ImageDecodeInfo *info) {
     free_block(state->rowBuffers);
     free_block(state->inflate.window.bytes);
     free_block(state->zeroRow);
-    free_block(state->inflate.lookup);
+    free_block(state->inflate.dynamic);
     PELMI_FreePNGHuffmanMemory(&state->fixedHuffmanPool);
     PELMI_FreePNGHuffmanMemory(&state->dynamicHuffmanPool);
     if (state->input != nullptr && state->readsMemory == 0) free_block(state->input->data);

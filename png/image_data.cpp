@@ -15,7 +15,6 @@ namespace {
 enum : uint32_t {
     resume_in_stored = 1,
     resume_at_symbol = 2,
-    resume_in_copy = 3,
     resume_at_row = 4,
     resume_at_block = 5
 };
@@ -24,7 +23,6 @@ uint32_t place_within_block(Step step) {
     switch (step) {
     case Step::stored: return resume_in_stored;
     case Step::symbols: return resume_at_symbol;
-    case Step::copy: return resume_in_copy;
     default: return resume_at_row;
     }
 }
@@ -47,7 +45,7 @@ bool allocate_stream_memory(Kind &rows) {
     PngDecodeState &state = *rows.state;
     if (state.fixedHuffmanPool == nullptr) state.fixedHuffmanPool = allocate_array<HuffmanNodePool>(1);
     if (state.fixedHuffmanPool == nullptr || !allocate_rows(rows)) return false;
-    if (state.inflate.window.bytes == nullptr) state.inflate.window.bytes = allocate_array<uint8_t>(window_size);
+    if (state.inflate.window.bytes == nullptr) state.inflate.window.bytes = allocate_array<uint8_t>(window_allocation);
     return state.inflate.window.bytes != nullptr;
 }
 

@@ -58,7 +58,7 @@ struct PngSamplePoint {
 };
 
 // Fills the record up to the size that hosts of 32-bit systems account for.
-constexpr size_t png_state_fill = 77;
+constexpr size_t png_state_fill = 155;
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed.
 struct PngDecodeState {

@@ -6,11 +6,12 @@
 
 namespace pelm {
 
-// One symbol of the code-length code, walked from the root: the code is used too briefly for a table.
+using CodeLengthTable = Symbol[1 << code_length_width];
+
 template <class Input>
-Stop take_code_length_symbol(BitReader &bits, Input &input, const HuffmanNode *nodes, uint32_t root, uint32_t &value) {
+Stop take_code_length_symbol(BitReader &bits, Input &input, const CodeLengthTable &table, uint32_t &value) {
     refill(bits, input);
-    const Symbol symbol = walk_on(nodes, root, 0, bits.bits);
+    const Symbol symbol = table[bits.bits & ((1u << code_length_width) - 1)];
     if (symbol.bits > bits.count) return Stop::input_ended;
     if (symbol.op == code_is_missing) return Stop::bad_code;
     drop(bits, symbol.bits);
@@ -29,17 +30,16 @@ bool take_run(BitReader &bits, Input &input, uint32_t symbol, uint32_t &repeat) 
 }
 
 template <class Input>
-Stop take_code_lengths(InflateState &state, Input &input, const HuffmanNode *nodes, uint32_t root, uint32_t total) {
-    uint8_t *const lengths = state.code_lengths;
+Stop take_code_lengths(BitReader &bits, Input &input, const CodeLengthTable &table, uint32_t total, uint8_t *lengths) {
     for (uint32_t done = 0; done < total;) {
         uint32_t symbol = 0;
-        const Stop got = take_code_length_symbol(state.bits, input, nodes, root, symbol);
+        const Stop got = take_code_length_symbol(bits, input, table, symbol);
         if (got != Stop::go_on) return got;
         uint32_t repeat = 1;
         uint8_t length = static_cast<uint8_t>(symbol);
         if (symbol >= 16) {
             if (symbol == 16 && done == 0) return Stop::bad_stream;
-            if (!take_run(state.bits, input, symbol, repeat)) return Stop::input_ended;
+            if (!take_run(bits, input, symbol, repeat)) return Stop::input_ended;
             if (repeat > total - done) return Stop::bad_stream;
             length = symbol == 16 ? lengths[done - 1] : uint8_t{0};
         }
@@ -47,6 +47,14 @@ Stop take_code_lengths(InflateState &state, Input &input, const HuffmanNode *nod
         done += repeat;
     }
     return Stop::go_on;
+}
+
+// Grown behind the trees of the latest block, which may serve once more.
+inline void make_code_length_table(const uint8_t (&code_lengths)[19], HuffmanNodePool &pool, CodeLengthTable &table) {
+    reset_pool(pool);
+    pool.nodeCount = HUFFMAN_BLOCK_NODES;
+    const HuffmanNode *const root = __PELMI_PngBuildHuffmanTable(code_lengths, 19, HUFFMAN_CODE_LENGTH, &pool);
+    fill_lookup<code_length_width>(table, pool.nodes, static_cast<uint32_t>(root - pool.nodes));
 }
 
 template <class Input>
@@ -57,9 +65,10 @@ Stop read_dynamic_header(InflateState &state, Input &input, HuffmanNodePool *&po
 
     uint32_t counts = 0;
     if (!take_bits(state.bits, input, 14, counts)) return Stop::input_ended;
-    const uint32_t literals = (counts & 31) + 257;
+    CodeLengths lengths;
+    lengths.literals = (counts & 31) + 257;
     // Required: 31 means no distance codes at all (docs/oddities.md, "Thirty-two distance codes").
-    const uint32_t distances = ((counts >> 5 & 31) + 1) & 31;
+    lengths.distances = ((counts >> 5 & 31) + 1) & 31;
     const uint32_t code_length_codes = (counts >> 10) + 4;
 
     uint8_t code_length_lengths[19] = {};
@@ -68,11 +77,10 @@ Stop read_dynamic_header(InflateState &state, Input &input, HuffmanNodePool *&po
         if (!take_bits(state.bits, input, 3, length)) return Stop::input_ended;
         code_length_lengths[order[i]] = static_cast<uint8_t>(length);
     }
-    reset_pool(*pool);
-    const HuffmanNode *const root = __PELMI_PngBuildHuffmanTable(code_length_lengths, 19, HUFFMAN_CODE_LENGTH, pool);
-    const Stop got =
-        take_code_lengths(state, input, pool->nodes, static_cast<uint32_t>(root - pool->nodes), literals + distances);
-    return got == Stop::go_on ? use_dynamic_trees(state, *pool, literals, distances) : got;
+    CodeLengthTable table;
+    make_code_length_table(code_length_lengths, *pool, table);
+    const Stop got = take_code_lengths(state.bits, input, table, lengths.literals + lengths.distances, lengths.lengths);
+    return got == Stop::go_on ? use_dynamic_codes(state, lengths, *pool) : got;
 }
 
 } // namespace pelm

@@ -1,6 +1,6 @@
 #include "png/inflate/fixed_codes.h"
 
-#include "png/inflate/alphabets.h"
+#include "png/inflate/make_table.h"
 
 namespace pelm {
 namespace {
@@ -40,8 +40,38 @@ constexpr LookupTables make_tables() {
     return tables;
 }
 
+// Lengths of the codes of all symbols; distances 30 and 31 are no symbols.
+struct CodeLengths {
+    uint8_t literals[288], distances[30];
+};
+
+constexpr CodeLengths make_code_lengths() {
+    CodeLengths lengths{};
+    for (uint32_t symbol = 0; symbol < 288; ++symbol)
+        lengths.literals[symbol] = symbol < 144 || symbol >= 280 ? 8 : symbol < 256 ? 9 : 7;
+    for (uint8_t &length : lengths.distances)
+        length = 5;
+    return lengths;
+}
+
+struct Entries {
+    uint32_t literals[1 << 9], distances[1 << 5];
+};
+
+constexpr Entries make_entries() {
+    constexpr CodeLengths lengths = make_code_lengths();
+    Entries entries{};
+    make_table<HUFFMAN_LITERAL_LENGTH>(lengths.literals, 288, 9, 1 << 9, entries.literals);
+    make_table<HUFFMAN_DISTANCE>(lengths.distances, 30, 5, 1 << 5, entries.distances);
+    return entries;
+}
+
+constexpr Entries entries = make_entries();
+
 } // namespace
 
+constexpr DecodingTable fixed_literals = {entries.literals, 9};
+constexpr DecodingTable fixed_distances = {entries.distances, 5};
 constexpr LookupTables fixed_lookup = make_tables();
 
 } // namespace pelm

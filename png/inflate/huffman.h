@@ -24,8 +24,8 @@ struct HuffmanNode {
     uint32_t child[2];   // index in the pool of the node behind a 0 and a 1 bit; 0: none, for node 0 is always a root
 };
 
-constexpr uint32_t HUFFMAN_POOL_NODES =
-    2500; // a deflate block's two codes need fewer than 1100, whatever their lengths
+constexpr uint32_t HUFFMAN_POOL_NODES = 2500;
+constexpr uint32_t HUFFMAN_BLOCK_NODES = 1100; // a deflate block's two codes need fewer, whatever their lengths
 
 struct HuffmanNodePool {
     uint32_t nodeCount; // used so far
@@ -47,6 +47,11 @@ PELM_EXPORT HuffmanNode *__PELMI_PngBuildHuffmanTable(const uint8_t *codeLengths
 PELM_EXPORT void PELMI_FreePNGHuffmanMemory(HuffmanNodePool **pool);
 
 namespace pelm {
+
+inline void reset_pool(HuffmanNodePool &pool) {
+    pool.nodeCount = 0;
+    pool.capacity = HUFFMAN_POOL_NODES;
+}
 
 inline bool is_leaf(const HuffmanNode &node) {
     return node.child[0] == 0;

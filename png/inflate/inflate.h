@@ -7,6 +7,7 @@
 #pragma once
 
 #include "png/inflate/dynamic_header.h"
+#include "png/inflate/fast_loop.h"
 
 namespace pelm {
 
@@ -18,7 +19,7 @@ Stop deliver(Window &window, Rows &rows) {
         window.delivered += taken;
         if (stop != Stop::go_on) return stop;
     }
-    wrap(window);
+    slide(window);
     return Stop::go_on;
 }
 
@@ -68,7 +69,7 @@ inline Stop end_block(InflateState &now) {
 template <class Input>
 Stop copy_stored(InflateState &now, Input &input) {
     Window &window = now.window;
-    const uint32_t wanted = std::min(now.stored_left, room(window));
+    const uint32_t wanted = std::min(now.stored_left, window_full - window.write);
     const uint32_t got = take_bytes(now.bits, input, window.bytes + window.write, wanted);
     produced(window, got);
     now.stored_left -= got;
@@ -76,60 +77,84 @@ Stop copy_stored(InflateState &now, Input &input) {
     return now.stored_left == 0 ? end_block(now) : Stop::go_on;
 }
 
-// The length symbol's extra bits and the distance that follows it.
+constexpr Symbol symbol_of_base(uint32_t entry, uint32_t exceptional) {
+    const uint32_t bits = entry >> 8 & 0xFF;
+    return {static_cast<uint16_t>(entry_base(entry, exceptional)),
+            static_cast<uint8_t>(HUFFMAN_BASE + entry_bits(entry) - bits), static_cast<uint8_t>(bits)};
+}
+
+// The next symbol, as far as the bits that are there tell.
+inline Symbol find_literal(InflateState &now, const BitReader &bits) {
+    if (now.literals.entries != nullptr) {
+        const uint32_t entry = find_entry(now.literals, bits.bits, exceptional_literal);
+        const auto code_bits = static_cast<uint8_t>(entry >> 26 & 15);
+        if ((entry & entry_is_literal) != 0) return {static_cast<uint8_t>(entry >> 8), HUFFMAN_LITERAL, code_bits};
+        if ((entry & exceptional_literal) == 0) return symbol_of_base(entry, exceptional_literal);
+        if ((entry & entry_ends_block) != 0) return {256, HUFFMAN_END_OF_BLOCK, static_cast<uint8_t>(entry)};
+    }
+    grow_trees(now);
+    return find_symbol(now.codes->literal, now.nodes, bits.bits);
+}
+
+inline Symbol find_distance(InflateState &now, const BitReader &bits) {
+    if (now.literals.entries != nullptr) {
+        const uint32_t entry = find_entry(now.distances, bits.bits, exceptional_distance);
+        if ((entry & exceptional_distance) == 0) return symbol_of_base(entry, exceptional_distance);
+    }
+    grow_trees(now);
+    return find_symbol(now.codes->distance, now.nodes, bits.bits);
+}
+
+// The length symbol's extra bits, the distance that follows it, and what they stand for.
 template <class Input>
-Stop read_match(InflateState &now, BitReader &bits, Input &input, Symbol length) {
-    uint32_t extra = 0;
-    if (length.op >= HUFFMAN_INVALID) return Stop::bad_code;
-    if (!take_bits(bits, input, length.op - HUFFMAN_BASE, extra)) return Stop::input_ended;
-    now.copy_length = length.value + extra;
+Stop take_match(InflateState &now, BitReader &bits, Input &input, Symbol symbol) {
+    uint32_t length = 0;
+    if (symbol.op >= HUFFMAN_INVALID) return Stop::bad_code;
+    if (!take_bits(bits, input, symbol.op - HUFFMAN_BASE, length)) return Stop::input_ended;
+    length += symbol.value;
 
     refill(bits, input);
-    const Symbol distance = find_symbol(now.codes->distance, now.nodes, bits.bits);
-    if (distance.bits > bits.count) return Stop::input_ended;
-    if (distance.op == code_is_missing) return Stop::bad_code;
-    drop(bits, distance.bits);
-    if (!take_bits(bits, input, distance.op - HUFFMAN_BASE, extra)) return Stop::input_ended;
-    now.copy_distance = distance.value + extra;
-    now.step = Step::copy;
+    symbol = find_distance(now, bits);
+    uint32_t distance = 0;
+    if (symbol.bits > bits.count) return Stop::input_ended;
+    if (symbol.op == code_is_missing) return Stop::bad_code;
+    drop(bits, symbol.bits);
+    if (!take_bits(bits, input, symbol.op - HUFFMAN_BASE, distance)) return Stop::input_ended;
+    copy_match(now.window, length, symbol.value + distance);
     return Stop::go_on;
 }
 
-inline void copy_pending_match(InflateState &now) {
-    while (now.copy_length != 0 && room(now.window) != 0)
-        now.copy_length -= copy_match(now.window, now.copy_length, now.copy_distance);
-    if (now.copy_length == 0) now.step = Step::symbols;
+// One literal or match, or the end of the block. The window is not full.
+template <class Input>
+Stop take_symbol(InflateState &now, BitReader &bits, Input &input) {
+    refill(bits, input);
+    const Symbol symbol = find_literal(now, bits);
+    if (symbol.bits > bits.count) return Stop::input_ended;
+    if (symbol.op == code_is_missing) return Stop::bad_code;
+    drop(bits, symbol.bits);
+    switch (symbol.op) {
+    case HUFFMAN_LITERAL:
+        now.window.bytes[now.window.write] = static_cast<uint8_t>(symbol.value);
+        produced(now.window, 1);
+        return Stop::go_on;
+    case HUFFMAN_END_OF_BLOCK: return end_block(now);
+    default: return take_match(now, bits, input, symbol);
+    }
 }
 
-// Literals and matches until the block ends or the window is full.
+// Until the block ends or the window is full.
 template <class Input>
-Stop read_symbols(InflateState &now, Input &input) {
+Stop take_symbols(InflateState &now, Input &input) {
     BitReader bits = now.bits;
     Stop stop = Stop::go_on;
-    while (stop == Stop::go_on && now.step == Step::symbols && room(now.window) != 0) {
-        uint8_t *const begin = now.window.bytes + now.window.write;
-        uint8_t *const end = now.window.bytes + window_size;
-        uint8_t *out = begin;
-        Symbol symbol{};
-        do { // literals, as long as they last
-            refill(bits, input);
-            symbol = find_symbol(now.codes->literal, now.nodes, bits.bits);
-            if (symbol.op != HUFFMAN_LITERAL || symbol.bits > bits.count) break;
-            drop(bits, symbol.bits);
-            *out++ = static_cast<uint8_t>(symbol.value);
-        } while (out != end);
-        produced(now.window, static_cast<uint32_t>(out - begin));
-        if (out == end) break;
-
-        if (symbol.bits > bits.count)
-            stop = Stop::input_ended;
-        else if (symbol.op == code_is_missing)
-            stop = Stop::bad_code;
-        else {
-            drop(bits, symbol.bits);
-            stop = symbol.op == HUFFMAN_END_OF_BLOCK ? end_block(now) : read_match(now, bits, input, symbol);
-            if (now.step == Step::copy) copy_pending_match(now);
+    while (stop == Stop::go_on && !is_full(now.window)) {
+        const bool ended = now.literals.entries != nullptr && run_fast(now.literals, now.distances, bits, input.next,
+                                                                       input.end, now.window);
+        if (ended) {
+            stop = end_block(now);
+            break;
         }
+        if (!is_full(now.window)) stop = take_symbol(now, bits, input);
     }
     now.bits = bits;
     return stop;
@@ -141,8 +166,7 @@ Stop run_step(InflateState &now, Input &input, HuffmanNodePool *&pool) {
     case Step::zlib_header: return read_zlib_header(now, input);
     case Step::block_header: return read_block_header(now, input, pool);
     case Step::stored: return copy_stored(now, input);
-    case Step::symbols: return read_symbols(now, input);
-    case Step::copy: copy_pending_match(now); return Stop::go_on;
+    case Step::symbols: return take_symbols(now, input);
     case Step::ended: break;
     }
     return Stop::finished;
@@ -150,13 +174,13 @@ Stop run_step(InflateState &now, Input &input, HuffmanNodePool *&pool) {
 
 // Goes on with the stream until `rows` or the stream itself says stop; with `pause_at_blocks` also at the end of every
 // block but the last. Called again after rows_done or block_ended it continues at the same bit, in either mode. It runs
-// ahead of its rows up to the end of the window or of the block, whichever comes first.
+// ahead of its rows until the window is full or the block ends, whichever comes first.
 //
 // `pool` takes the trees of dynamic blocks; allocated for the first of them, and owned by whoever owns the pointer.
 template <class Input, class Rows>
 Stop inflate(InflateState &state, Input &input, Rows &rows, HuffmanNodePool *&pool, bool pause_at_blocks) {
     for (;;) {
-        const bool must_deliver = state.held != Stop::go_on || room(state.window) == 0;
+        const bool must_deliver = state.held != Stop::go_on || is_full(state.window);
         const Stop rows_say = must_deliver ? deliver(state.window, rows) : Stop::go_on;
         if (rows_say != Stop::go_on) return rows_say;
 

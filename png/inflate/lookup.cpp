@@ -12,7 +12,7 @@ Symbol symbol_of(const HuffmanNode &leaf) {
 Symbol entry_of(const HuffmanNode *nodes, uint32_t node, uint32_t depth) {
     if (node == 0) return {0, code_is_missing, static_cast<uint8_t>(depth)};
     if (is_leaf(nodes[node])) return symbol_of(nodes[node]);
-    return {static_cast<uint16_t>(node), code_goes_on, lookup_width};
+    return {static_cast<uint16_t>(node), code_goes_on, static_cast<uint8_t>(depth)};
 }
 
 // The first `count` entries behind themselves, four at once where there are as many: a call for the many short copies
@@ -29,14 +29,13 @@ void copy_up(Symbol *table, uint32_t count) {
 
 } // namespace
 
-// Level by level: the table of one bit more is that of the level before twice, but for what goes on. So that a stream
-// of many small blocks pays little more for each than its few codes.
-void fill_lookup(Symbol (&table)[lookup_entries], const HuffmanNode *nodes, uint32_t root) {
-    uint16_t lists[2][lookup_entries]; // the entries whose codes go on, of this level and of the next
+template <uint32_t width>
+void fill_lookup(Symbol (&table)[1 << width], const HuffmanNode *nodes, uint32_t root) {
+    uint16_t lists[2][1 << width]; // the entries whose codes go on, of this level and of the next
     uint32_t going_on = 1;
     lists[0][0] = 0;
-    table[0] = {static_cast<uint16_t>(root), code_goes_on, lookup_width};
-    for (uint32_t depth = 0; depth < lookup_width; ++depth) {
+    table[0] = {static_cast<uint16_t>(root), code_goes_on, 0};
+    for (uint32_t depth = 0; depth < width; ++depth) {
         const uint16_t *const entries = lists[depth & 1];
         uint16_t *const next = lists[(depth + 1) & 1];
         uint32_t next_count = 0;
@@ -52,6 +51,9 @@ void fill_lookup(Symbol (&table)[lookup_entries], const HuffmanNode *nodes, uint
         going_on = next_count;
     }
 }
+
+template void fill_lookup<lookup_width>(Symbol (&)[1 << lookup_width], const HuffmanNode *, uint32_t);
+template void fill_lookup<code_length_width>(Symbol (&)[1 << code_length_width], const HuffmanNode *, uint32_t);
 
 Symbol walk_on(const HuffmanNode *nodes, uint32_t node, uint32_t depth, size_t bits) {
     for (;; bits >>= 1) {

@@ -6,7 +6,8 @@
 
 namespace pelm {
 
-constexpr uint32_t lookup_width = 9; // bits; two tables of that width fit the allocation of 5101 bytes
+constexpr uint32_t lookup_width = 9;      // bits
+constexpr uint32_t code_length_width = 7; // of the code that code lengths are written in: all of its codes
 constexpr uint32_t lookup_entries = 1u << lookup_width;
 
 // `op` of entries that are no leaves.
@@ -26,10 +27,10 @@ struct LookupTables {
     Symbol distance[lookup_entries];
 };
 
-constexpr uint32_t lookup_allocation = 5101;
-static_assert(sizeof(LookupTables) <= lookup_allocation);
-
-void fill_lookup(Symbol (&table)[lookup_entries], const HuffmanNode *nodes, uint32_t root);
+// Level by level: the table of one bit more is that of the level before twice, but for what goes on. So that a stream
+// of many small blocks pays little more for each than its few codes.
+template <uint32_t width>
+void fill_lookup(Symbol (&table)[1 << width], const HuffmanNode *nodes, uint32_t root);
 
 // Goes on from a node that `depth` bits lead to; `bits` are the following ones, lowest first.
 Symbol walk_on(const HuffmanNode *nodes, uint32_t node, uint32_t depth, size_t bits);

@@ -1,4 +1,4 @@
-// A block's trees and the lookup tables in front of them.
+// A block's codes: decoding tables at once; trees, and the lookup tables in front of them, when something asks for them.
 #include "frame/memory.h"
 #include "png/inflate/fixed_codes.h"
 #include "png/inflate/state.h"
@@ -6,53 +6,88 @@
 namespace pelm {
 namespace {
 
-uint32_t build(HuffmanNodePool &pool, const uint8_t *code_lengths, uint32_t count, HuffmanAlphabetKind kind) {
-    return static_cast<uint32_t>(__PELMI_PngBuildHuffmanTable(code_lengths, count, kind, &pool) - pool.nodes);
+// The allocation comes with the first compressed block, whatever its codes.
+bool allocate_tables(InflateState &state) {
+    if (state.dynamic != nullptr) return true;
+    state.dynamic = allocate_array<BlockCodes>(1);
+    if (state.dynamic == nullptr) return false;
+    state.dynamic->lengths.literals = 0;
+    return true;
 }
 
-// The allocation comes with the first compressed block, whatever its codes.
-bool allocate_lookup(InflateState &state) {
-    if (state.lookup == nullptr) state.lookup = static_cast<LookupTables *>(allocate(lookup_allocation));
-    return state.lookup != nullptr;
+bool are_equal(const CodeLengths &a, const CodeLengths &b) {
+    return a.literals == b.literals && a.distances == b.distances &&
+           std::memcmp(a.lengths, b.lengths, a.literals + a.distances) == 0;
+}
+
+void make_tables(BlockCodes &codes) {
+    const CodeLengths &lengths = codes.lengths;
+    codes.literals =
+        make_literal_table(lengths.lengths, lengths.literals, widest_literal_table, codes.literal_entries);
+    codes.distances = make_distance_table(lengths.lengths + lengths.literals, lengths.distances,
+                                          widest_distance_table, codes.distance_entries);
+    if (codes.distances.entries == nullptr) codes.literals = {};
+}
+
+uint32_t grow_tree(HuffmanNodePool &pool, const uint8_t *code_lengths, uint32_t count, HuffmanAlphabetKind kind) {
+    return static_cast<uint32_t>(__PELMI_PngBuildHuffmanTable(code_lengths, count, kind, &pool) - pool.nodes);
 }
 
 } // namespace
 
-void reset_pool(HuffmanNodePool &pool) {
-    pool.nodeCount = 0;
-    pool.capacity = HUFFMAN_POOL_NODES;
-}
-
 void restart(InflateState &state) {
     uint8_t *const window = state.window.bytes;
-    state.window = {window, 0, 0, 0, 0};
+    state.window = {window, 0, 0, 0};
     state.bits = {};
     state.step = Step::zlib_header;
     state.final_block = false;
     state.held = Stop::go_on;
     state.stored_left = 0;
-    state.copy_length = 0;
+    if (state.dynamic != nullptr) state.dynamic->lengths.literals = 0;
 }
 
 Stop use_fixed_codes(InflateState &state) {
-    if (!allocate_lookup(state)) return Stop::no_lookup_memory;
+    if (!allocate_tables(state)) return Stop::no_lookup_memory;
+    state.literals = state.careful ? DecodingTable{} : fixed_literals;
+    state.distances = fixed_distances;
     state.codes = &fixed_lookup;
     state.nodes = nullptr; // no walk goes beyond the tables
     state.step = Step::symbols;
     return Stop::go_on;
 }
 
-Stop use_dynamic_trees(InflateState &state, HuffmanNodePool &pool, uint32_t literal_count, uint32_t distance_count) {
-    reset_pool(pool);
-    const uint32_t literal = build(pool, state.code_lengths, literal_count, HUFFMAN_LITERAL_LENGTH);
-    const uint32_t distance = build(pool, state.code_lengths + literal_count, distance_count, HUFFMAN_DISTANCE);
-    if (!allocate_lookup(state)) return Stop::no_lookup_memory;
-    fill_lookup(state.lookup->literal, pool.nodes, literal);
-    fill_lookup(state.lookup->distance, pool.nodes, distance);
-    state.codes = state.lookup;
-    state.nodes = pool.nodes;
+Stop use_dynamic_codes(InflateState &state, const CodeLengths &lengths, HuffmanNodePool &pool) {
+    if (!allocate_tables(state)) return Stop::no_lookup_memory;
+    BlockCodes &codes = *state.dynamic;
+    if (!are_equal(codes.lengths, lengths)) {
+        codes.lengths = lengths;
+        codes.trees_are_grown = false;
+        make_tables(codes);
+    }
+    state.literals = state.careful ? DecodingTable{} : codes.literals;
+    state.distances = codes.distances;
+    state.codes = nullptr;
+    state.pool = &pool;
     state.step = Step::symbols;
     return Stop::go_on;
+}
+
+void grow_trees(InflateState &state) {
+    if (state.codes != nullptr) return;
+    BlockCodes &codes = *state.dynamic;
+    HuffmanNodePool &pool = *state.pool;
+    if (!codes.trees_are_grown) {
+        reset_pool(pool);
+        const uint8_t *const lengths = codes.lengths.lengths;
+        const uint32_t literals = grow_tree(pool, lengths, codes.lengths.literals, HUFFMAN_LITERAL_LENGTH);
+        const uint32_t distances =
+            grow_tree(pool, lengths + codes.lengths.literals, codes.lengths.distances, HUFFMAN_DISTANCE);
+        fill_lookup<lookup_width>(codes.lookup.literal, pool.nodes, literals);
+        fill_lookup<lookup_width>(codes.lookup.distance, pool.nodes, distances);
+        codes.trees_are_grown = true;
+    }
+    state.codes = &codes.lookup;
+    state.nodes = pool.nodes;
 }
 
 } // namespace pelm

@@ -74,7 +74,7 @@ Blocks png_blocks(const Bytes &file, Size size, uint32_t kind, uint32_t scaled_w
     if (kind != PELM_SOURCE_MEMORY) blocks.push_back(16384);
     if (file[25] == 3) blocks.insert(blocks.end(), {768, 2 * read_u32be(&file[33])});
     blocks.insert(blocks.end(), {2048 * sizeof(PngIdatEntry), 4 * size.width, 4 * scaled_width, 50008,
-                                 2 * (row + size.width), 32768, 5101});
+                                 2 * (row + size.width), 98608, sizeof(BlockCodes)});
     return blocks;
 }
 

@@ -60,6 +60,7 @@ struct Options {
     ptrdiff_t piece = 0; // 0: all bytes at once
     uint32_t stop_after = 0;
     bool pause_at_blocks = false;
+    bool careful = false; // without decoding tables
 };
 
 struct Outcome {
@@ -69,6 +70,12 @@ struct Outcome {
     size_t stops = 0;           // reported because of the rows
     size_t unread = 0;          // bytes of the input that were not even looked at
     uint32_t total = 0;
+
+    // But for how far it looked ahead.
+    bool equals(const Outcome &other) const {
+        return bytes == other.bytes && stop == other.stop && pauses == other.pauses && stops == other.stops &&
+               total == other.total;
+    }
 };
 
 // One decompression, call by call. Its stream ends against an inaccessible page, and the blocks that it takes are those
@@ -81,15 +88,16 @@ public:
         std::copy(stream.begin(), stream.end(), copy);
         whole_ = {copy, copy + stream.size()};
         pieces_ = {copy, copy, copy + stream.size(), options.piece};
-        state.window.bytes = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(window_size));
+        state.window.bytes = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(window_allocation));
         rows.stop_after = options.stop_after;
+        state.careful = options.careful;
         restart(state);
     }
     Inflater(const Inflater &) = delete;
     Inflater &operator=(const Inflater &) = delete;
     ~Inflater() {
         ZOTARPELM_OsFree(state.window.bytes);
-        if (state.lookup != nullptr) ZOTARPELM_OsFree(state.lookup);
+        if (state.dynamic != nullptr) ZOTARPELM_OsFree(state.dynamic);
         PELMI_FreePNGHuffmanMemory(&pool);
     }
 
@@ -113,7 +121,7 @@ private:
 };
 
 // Called again and again until it ends for good.
-inline Outcome inflated(const Bytes &stream, const Options &options = {}) {
+inline Outcome inflated_one_way(const Bytes &stream, const Options &options = {}) {
     Inflater inflater(stream, options);
     Outcome outcome;
     for (;;) {
@@ -128,6 +136,16 @@ inline Outcome inflated(const Bytes &stream, const Options &options = {}) {
     outcome.bytes = inflater.rows.bytes;
     outcome.unread = inflater.unread();
     outcome.total = inflater.state.window.total;
+    return outcome;
+}
+
+// The same, and the careful way must come to the same.
+inline Outcome inflated(const Bytes &stream, Options options = {}) {
+    const Outcome outcome = inflated_one_way(stream, options);
+    options.careful = true;
+    const Outcome careful = inflated_one_way(stream, options);
+    EXPECT_TRUE(outcome.equals(careful)) << "carefully: " << careful.stop << ", " << careful.bytes.size()
+                                         << " bytes; fast: " << outcome.stop << ", " << outcome.bytes.size();
     return outcome;
 }
 

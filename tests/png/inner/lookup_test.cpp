@@ -20,7 +20,7 @@ struct Tables {
 void fill(Tables &made, Symbol (&table)[lookup_entries], const Bytes &lengths, HuffmanAlphabetKind kind) {
     const HuffmanNode *const root =
         __PELMI_PngBuildHuffmanTable(lengths.data(), static_cast<uint32_t>(lengths.size()), kind, made.pool.get());
-    fill_lookup(table, made.pool->nodes, static_cast<uint32_t>(root - made.pool->nodes));
+    fill_lookup<lookup_width>(table, made.pool->nodes, static_cast<uint32_t>(root - made.pool->nodes));
 }
 
 void expect_lookup_equals_walk(const Bytes &lengths, HuffmanAlphabetKind kind) {
