@@ -9,6 +9,7 @@
 #include "frame/bytes.h"
 #include "frame/packed.h"
 #include "frame/pixel.h"
+#include "frame/swizzle.h"
 
 namespace pelm {
 
@@ -105,6 +106,7 @@ struct MaskedRow {
 struct Bgr24Row {
     using Sum = TenBitSums;
     static constexpr uint32_t bits = 24;
+    static constexpr ChannelBytes channels = {3, 2, 1, 0, ChannelBytes::none};
     const uint8_t *row;
 
     Rgb operator()(int32_t x) const {
@@ -117,11 +119,12 @@ struct Bgr24Row {
 struct Bgrx32Row {
     using Sum = QuarterSums;
     static constexpr uint32_t bits = 32;
+    static constexpr ChannelBytes channels = {4, 2, 1, 0, ChannelBytes::none}; // the fourth byte is no alpha
     const uint8_t *row;
 
     Rgb operator()(int32_t x) const {
         const uint8_t *const at = row + 4 * ptrdiff_t{x};
-        return {at[2], at[1], at[0]}; // the fourth byte is no alpha
+        return {at[2], at[1], at[0]};
     }
     uint32_t sample(int32_t x) const { return (read_u32le(row + 4 * ptrdiff_t{x}) >> 2) & 0x3F3F3F3F; }
 };

@@ -18,9 +18,12 @@ Kernels find_kernels() {
 #if defined(__x86_64__) || defined(__i386__)
     unsigned eax, ebx, ecx, edx;
     const bool has_answer = __get_cpuid(1, &eax, &ebx, &ecx, &edx) != 0;
-    if (has_answer && (ecx & bit_PCLMUL) != 0 && (edx & bit_SSE2) != 0) return Kernels::carryless;
-#endif
+    const bool has_shuffles = has_answer && (ecx & bit_SSSE3) != 0 && (edx & bit_SSE2) != 0;
+    if (has_shuffles) return (ecx & bit_PCLMUL) != 0 ? Kernels::carryless : Kernels::shuffles;
     return lanes_are_fast ? Kernels::lanes : Kernels::plain;
+#else
+    return lanes_are_fast ? Kernels::shuffles : Kernels::plain;
+#endif
 }
 
 } // namespace

@@ -7,8 +7,10 @@ namespace pelm {
 
 // Each includes those before it.
 enum class Kernels : uint8_t {
-    plain = 1,
+    careful = 1, // no fast loops either: what all others are held against
+    plain,
     lanes,     // frame/lanes.h, where lanes_are_fast
+    shuffles,  // and bytes put into any order: frame/swizzle.cpp
     carryless, // and x86's carry-less multiplication
 };
 

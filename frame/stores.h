@@ -1,8 +1,10 @@
-// How one pixel of each output format lies in memory.
+// How one pixel of each output format lies in memory. A store whose pixels are whole channels also names their bytes,
+// for rows that are made of such pixels (frame/swizzle.h).
 #pragma once
 
 #include "frame/bytes.h"
 #include "frame/pixel.h"
+#include "frame/swizzle.h"
 
 namespace pelm {
 
@@ -22,6 +24,8 @@ inline void put_rgb888(uint8_t *at, Pixel pixel) {
 
 struct StoreRgb565 {
     static constexpr int32_t size = 2;
+    static constexpr ChannelBytes channels = {4, 0, 1, 2, ChannelBytes::none};
+    static constexpr SwizzleTo swizzle_to = SwizzleTo::rgb565;
     template <class Pixel>
     static void put(uint8_t *at, Pixel pixel) {
         put_rgb565(at, pixel);
@@ -30,6 +34,8 @@ struct StoreRgb565 {
 
 struct StoreRgb888 {
     static constexpr int32_t size = 3;
+    static constexpr ChannelBytes channels = {3, 0, 1, 2, ChannelBytes::none};
+    static constexpr SwizzleTo swizzle_to = SwizzleTo::triples;
     template <class Pixel>
     static void put(uint8_t *at, Pixel pixel) {
         put_rgb888(at, pixel);
@@ -38,6 +44,8 @@ struct StoreRgb888 {
 
 struct StoreArgb8888 {
     static constexpr int32_t size = 4;
+    static constexpr ChannelBytes channels = {4, 1, 2, 3, 0};
+    static constexpr SwizzleTo swizzle_to = SwizzleTo::words;
     template <class Pixel>
     static void put(uint8_t *at, Pixel pixel) {
         const Rgb c = channels_of(pixel);
@@ -58,6 +66,8 @@ struct StoreRgb565A8 {
 
 struct StoreRgba8888 {
     static constexpr int32_t size = 4;
+    static constexpr ChannelBytes channels = {4, 0, 1, 2, 3};
+    static constexpr SwizzleTo swizzle_to = SwizzleTo::words;
     template <class Pixel>
     static void put(uint8_t *at, Pixel pixel) {
         const Rgb c = channels_of(pixel);
@@ -67,6 +77,8 @@ struct StoreRgba8888 {
 
 struct StoreBgra8888 {
     static constexpr int32_t size = 4;
+    static constexpr ChannelBytes channels = {4, 2, 1, 0, 3};
+    static constexpr SwizzleTo swizzle_to = SwizzleTo::words;
     template <class Pixel>
     static void put(uint8_t *at, Pixel pixel) {
         const Rgb c = channels_of(pixel);

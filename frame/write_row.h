@@ -1,9 +1,11 @@
 // Source layout x output format x direction: one row loop combines them.
 //
 // A `Load` is a source row: load(x) gives the pixel in column x, in any type that frame/pixel.h's questions have
-// answers for. A store is one of frame/stores.h.
+// answers for. Where that is nothing but bytes of the row, `channels` says which, and `row` is where they are. A store is
+// one of frame/stores.h.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <type_traits>
 
@@ -19,11 +21,42 @@ inline void write_run(const Load &load, int32_t from, int32_t count, uint8_t *__
         Store::put(out + i * step, load(from + static_cast<int32_t>(i)));
 }
 
+template <class Store, class Load>
+concept IsSwizzle = requires {
+    Load::channels;
+    Store::channels;
+};
+
+template <class Store>
+using DenseStep = std::integral_constant<ptrdiff_t, Store::size>;
+
+// Whole groups of pixels as bytes, the others one by one: those at the end, and groups that blend.
+template <class Store, class Load>
+void write_run_in_groups(const Load &load, int32_t from, int32_t count, uint8_t *out) {
+    static constexpr Swizzle how = make_swizzle(Load::channels, Store::channels, Store::swizzle_to);
+    while (count > 0) {
+        const int32_t done = swizzle(how, load.row + ptrdiff_t{from} * how.source_size, count, out);
+        const int32_t singly = std::min(count - done, done == 0 ? 32 : 4);
+        write_run<Store>(load, from + done, singly, out + ptrdiff_t{done} * Store::size, DenseStep<Store>());
+        from += done + singly;
+        count -= done + singly;
+        out += ptrdiff_t{done + singly} * Store::size;
+    }
+}
+
+// Pixels one behind the other.
+template <class Store, class Load>
+inline void write_dense_run(const Load &load, int32_t from, int32_t count, uint8_t *out) {
+    if constexpr (IsSwizzle<Store, Load>)
+        if (can_swizzle()) return write_run_in_groups<Store>(load, from, count, out);
+    write_run<Store>(load, from, count, out, DenseStep<Store>());
+}
+
 // Columns from .. from + count - 1, the first one to `out`, `step` bytes apart.
 template <class Store, class Load>
 inline void write_run_as(const Load &load, int32_t from, int32_t count, uint8_t *out, ptrdiff_t step) {
     if (step == Store::size)
-        write_run<Store>(load, from, count, out, std::integral_constant<ptrdiff_t, Store::size>());
+        write_dense_run<Store>(load, from, count, out);
     else
         write_run<Store>(load, from, count, out, step);
 }

@@ -30,12 +30,14 @@ struct NarrowGreyRow {
 
 template <int32_t sample_bytes>
 struct GreyRow {
+    static constexpr ChannelBytes channels = {sample_bytes, 0, 0, 0, ChannelBytes::none};
     const uint8_t *row;
     Rgb operator()(int32_t x) const { return grey(row[ptrdiff_t{x} * sample_bytes]); }
 };
 
 template <int32_t sample_bytes>
 struct GreyAlphaRow {
+    static constexpr ChannelBytes channels = {2 * sample_bytes, 0, 0, 0, sample_bytes};
     const uint8_t *row;
     Rgba operator()(int32_t x) const {
         const uint8_t *const at = row + 2 * sample_bytes * ptrdiff_t{x};
@@ -45,6 +47,7 @@ struct GreyAlphaRow {
 
 template <int32_t sample_bytes>
 struct RgbRow {
+    static constexpr ChannelBytes channels = {3 * sample_bytes, 0, sample_bytes, 2 * sample_bytes, ChannelBytes::none};
     const uint8_t *row;
     Rgb operator()(int32_t x) const {
         const uint8_t *const at = row + 3 * sample_bytes * ptrdiff_t{x};
@@ -54,6 +57,7 @@ struct RgbRow {
 
 template <int32_t sample_bytes>
 struct RgbaRow {
+    static constexpr ChannelBytes channels = {4 * sample_bytes, 0, sample_bytes, 2 * sample_bytes, 3 * sample_bytes};
     const uint8_t *row;
     Rgba operator()(int32_t x) const {
         const uint8_t *const at = row + 4 * sample_bytes * ptrdiff_t{x};

@@ -8,15 +8,25 @@
 #include "png/pixels.h"
 #include "png/placing.h"
 #include "png/unfilter.h"
+#include "png/unfilter_two_rows.h"
 
 namespace pelm {
 namespace {
+
+// The longest rows, in bytes, that a third buffer is spent on.
+constexpr uint32_t longest_row_ahead = 65536;
+
+bool has_row_ahead(uint64_t row) {
+    return row <= longest_row_ahead;
+}
 
 // The row buffers fit a row of the whole image.
 bool allocate_row_buffers(PngDecodeState &state) {
     const uint64_t row = (uint64_t{state.wholeWidth} * state.bitsPerPixel + 7) / 8 + 1;
     state.rowLength = static_cast<uint32_t>(row); // wraps only where there is no memory for it
-    if (state.rowBuffers == nullptr) state.rowBuffers = allocate_array<uint8_t>(2 * (row + state.wholeWidth));
+    const uint64_t two_rows = 2 * (row + state.wholeWidth);
+    const uint64_t bytes = has_row_ahead(row) ? std::max(two_rows, 3 * row) : two_rows;
+    if (state.rowBuffers == nullptr) state.rowBuffers = allocate_array<uint8_t>(bytes);
     return state.rowBuffers != nullptr;
 }
 
@@ -25,6 +35,8 @@ void restart_state(PngDecodeState &state) {
     state.imageHeight = state.wholeHeight;
     state.rowNow = state.rowBuffers;
     state.rowBefore = state.rowBuffers + state.rowLength;
+    state.rowAhead = has_row_ahead(state.rowLength) ? state.rowBefore + state.rowLength : nullptr;
+    state.rowAheadIsDone = 0;
     state.rowFilled = 0;
     for (uint32_t i = 0; i < 4; ++i) {
         const auto across = uint64_t{state.wholeWidth} * (i % 2 == 0 ? 1 : 3) >> 2;
@@ -49,6 +61,24 @@ bool stops_here(const PngDecodeState &state, uint32_t rows_before) {
     const bool counts_each_row = state.isOneToOne != 0 || (state.colourType == 0 && state.bitDepth == 8);
     if (counts_each_row) return state.rowsDone == state.stopRow;
     return rows_before < state.stopRow && state.rowsDone >= state.stopRow;
+}
+
+// Undoes the filter of the complete row in rowNow, below the reconstructed row `above`, and makes it the current one.
+// Where that is faster the following row is done with it: unseen, for its bytes come again, with rowAheadIsDone set.
+void reconstruct_row(PngDecodeState &state, const uint8_t *above, const uint8_t *following) {
+    if (state.rowAheadIsDone != 0) {
+        state.rowAheadIsDone = 0;
+        std::swap(state.rowNow, state.rowAhead);
+    } else if (following != nullptr && state.rowAhead != nullptr &&
+               two_rows_pay(state.rowNow[0], following[0], state.bytesPerPixel)) {
+        std::memcpy(state.rowAhead, following, state.rowLength);
+        unfilter_two_rows({state.rowNow + 1, state.rowAhead + 1, above, state.rowLength - 1, state.bytesPerPixel,
+                           state.rowNow[0], following[0]});
+        state.rowAheadIsDone = 1;
+    } else {
+        __PELMI_PngReadFilterRow(&state, state.rowNow + 1, above, state.rowLength - 1);
+    }
+    state.currentRow = state.rowNow + 1;
 }
 
 // To pass `pass`, or the next one that has pixels. Behind the last one there is only surplus data.
@@ -87,19 +117,19 @@ void restart_rows(Adam7Rows &rows) {
     enter_pass(*rows.state, 1);
 }
 
-Stop finish_row(PlainRows &rows) {
+Stop finish_row(PlainRows &rows, const uint8_t *following) {
     PngDecodeState &state = *rows.state;
-    __PELMI_PngReadFilterRow(&state, state.rowNow + 1, state.rowBefore + 1, state.rowLength - 1);
+    reconstruct_row(state, state.rowBefore + 1, following);
     std::swap(state.rowNow, state.rowBefore);
     const uint32_t rows_before = state.rowsDone;
     write_current_row(rows, 0);
     return stops_here(state, rows_before) ? Stop::rows_done : ask_host(rows);
 }
 
-Stop finish_row(Adam7Rows &rows) {
+Stop finish_row(Adam7Rows &rows, const uint8_t *following) {
     PngDecodeState &state = *rows.state;
-    const uint8_t *const above = state.passRow == 0 ? state.zeroRow : state.rowBefore + 1;
-    __PELMI_PngReadFilterRow(&state, state.rowNow + 1, above, state.rowLength - 1);
+    const bool is_last = state.passRow + 1 == state.imageHeight; // what follows is the next pass
+    reconstruct_row(state, state.passRow == 0 ? state.zeroRow : state.rowBefore + 1, is_last ? nullptr : following);
     std::swap(state.rowNow, state.rowBefore);
     write_current_row(rows, state.passRow);
     const Stop stop = ask_host(rows);

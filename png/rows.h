@@ -30,9 +30,10 @@ bool allocate_rows(Adam7Rows &rows);
 void restart_rows(PlainRows &rows);
 void restart_rows(Adam7Rows &rows);
 
-// The current row is complete. go_on, rows_done or host_stopped.
-Stop finish_row(PlainRows &rows);
-Stop finish_row(Adam7Rows &rows);
+// The current row is complete; `following` are the bytes of the next one where all of them are at hand, else NULL.
+// go_on, rows_done or host_stopped.
+Stop finish_row(PlainRows &rows, const uint8_t *following);
+Stop finish_row(Adam7Rows &rows, const uint8_t *following);
 
 // The image is complete.
 void finish_image(PlainRows &rows);
@@ -53,8 +54,7 @@ Stop take_run(Kind &rows, const uint8_t *bytes, uint32_t count, uint32_t &taken)
         taken += run;
         if (state.rowFilled < state.rowLength) break;
         state.rowFilled = 0;
-        state.currentRow = state.rowNow + 1;
-        const Stop stop = finish_row(rows);
+        const Stop stop = finish_row(rows, count - taken >= state.rowLength ? bytes + taken : nullptr);
         if (stop != Stop::go_on) return stop;
     }
     return Stop::go_on;

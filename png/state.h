@@ -58,7 +58,7 @@ struct PngSamplePoint {
 };
 
 // Fills the record up to the size that hosts of 32-bit systems account for.
-constexpr size_t png_state_fill = 155;
+constexpr size_t png_state_fill = 153;
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed.
 struct PngDecodeState {
@@ -92,11 +92,13 @@ struct PngDecodeState {
     uint32_t scaledHeight;
 
     // The image-data loops.
-    uint8_t *rowBuffers; // two rows and room, one allocation
+    uint8_t *rowBuffers; // two or three rows and room, one allocation
     uint8_t *zeroRow;    // Adam7
     pelm::InflateState inflate;
     uint8_t *rowNow; // the one being filled, filter byte first
     uint8_t *rowBefore;
+    uint8_t *rowAhead;        // a third one, NULL for very long rows
+    uint32_t rowAheadIsDone;  // it holds the row that rowNow is being filled with, reconstructed
     uint32_t rowFilled;       // bytes of it so far
     uint32_t rowLength;       // filter byte included
     uint32_t idatIndexed;     // entries of idatTable; idatCount counts down as streams use them up

@@ -50,7 +50,6 @@ struct InflateState {
     BitReader bits;
     Step step;
     bool final_block;
-    bool careful;         // decoding tables are not used
     Stop held;            // outcome that waits until the bytes before it have been delivered; go_on: none
     uint32_t stored_left; // step stored: bytes of the block still to come
     // Step symbols, of the block:

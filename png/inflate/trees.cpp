@@ -1,5 +1,6 @@
 // A block's codes: decoding tables at once; trees, and the lookup tables in front of them, when something asks for them.
 #include "frame/memory.h"
+#include "frame/processor.h"
 #include "png/inflate/fixed_codes.h"
 #include "png/inflate/state.h"
 
@@ -29,6 +30,11 @@ void make_tables(BlockCodes &codes) {
     if (codes.distances.entries == nullptr) codes.literals = {};
 }
 
+void use_tables(InflateState &state, const DecodingTable &literals, const DecodingTable &distances) {
+    state.literals = kernels() == Kernels::careful ? DecodingTable{} : literals;
+    state.distances = distances;
+}
+
 uint32_t grow_tree(HuffmanNodePool &pool, const uint8_t *code_lengths, uint32_t count, HuffmanAlphabetKind kind) {
     return static_cast<uint32_t>(__PELMI_PngBuildHuffmanTable(code_lengths, count, kind, &pool) - pool.nodes);
 }
@@ -48,8 +54,7 @@ void restart(InflateState &state) {
 
 Stop use_fixed_codes(InflateState &state) {
     if (!allocate_tables(state)) return Stop::no_lookup_memory;
-    state.literals = state.careful ? DecodingTable{} : fixed_literals;
-    state.distances = fixed_distances;
+    use_tables(state, fixed_literals, fixed_distances);
     state.codes = &fixed_lookup;
     state.nodes = nullptr; // no walk goes beyond the tables
     state.step = Step::symbols;
@@ -64,8 +69,7 @@ Stop use_dynamic_codes(InflateState &state, const CodeLengths &lengths, HuffmanN
         codes.trees_are_grown = false;
         make_tables(codes);
     }
-    state.literals = state.careful ? DecodingTable{} : codes.literals;
-    state.distances = codes.distances;
+    use_tables(state, codes.literals, codes.distances);
     state.codes = nullptr;
     state.pool = &pool;
     state.step = Step::symbols;

@@ -1,4 +1,4 @@
-// Whole decodes by plain code and by each other kind: the same output and results.
+// Whole decodes by careful code and by each other kind: the same output and results.
 #include <gtest/gtest.h>
 
 #include "tests/support/kernels.h"
@@ -27,7 +27,7 @@ size_t compare(const std::vector<Input> &inputs, uint32_t step) {
             const Setting setting = nth_setting(*decode.input, format, number++ * 7 % setting_count);
             const size_t size = output_size(decode, setting).value_or(0);
             PelmTest_Reset();
-            const Outcome expected = outcome_with(Kernels::plain, decode, setting, size);
+            const Outcome expected = outcome_with(Kernels::careful, decode, setting, size);
             for (const Kernels kind : test::all_kernels())
                 EXPECT_EQ(outcome_with(kind, decode, setting, size), expected)
                     << decode.name() << ", " << setting.name() << ", kernels " << static_cast<int>(kind);

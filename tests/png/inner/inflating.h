@@ -8,6 +8,7 @@
 #include "png/inflate/inflate.h"
 #include "tests/png/inner/noise.h"
 #include "tests/support/guarded_buffer.h"
+#include "tests/support/kernels.h"
 #include "tests/support/test_host.h"
 
 namespace pelm {
@@ -60,7 +61,6 @@ struct Options {
     ptrdiff_t piece = 0; // 0: all bytes at once
     uint32_t stop_after = 0;
     bool pause_at_blocks = false;
-    bool careful = false; // without decoding tables
 };
 
 struct Outcome {
@@ -90,7 +90,6 @@ public:
         pieces_ = {copy, copy, copy + stream.size(), options.piece};
         state.window.bytes = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(window_allocation));
         rows.stop_after = options.stop_after;
-        state.careful = options.careful;
         restart(state);
     }
     Inflater(const Inflater &) = delete;
@@ -140,9 +139,9 @@ inline Outcome inflated_one_way(const Bytes &stream, const Options &options = {}
 }
 
 // The same, and the careful way must come to the same.
-inline Outcome inflated(const Bytes &stream, Options options = {}) {
+inline Outcome inflated(const Bytes &stream, const Options &options = {}) {
     const Outcome outcome = inflated_one_way(stream, options);
-    options.careful = true;
+    const WithKernels with(Kernels::careful);
     const Outcome careful = inflated_one_way(stream, options);
     EXPECT_TRUE(outcome.equals(careful)) << "carefully: " << careful.stop << ", " << careful.bytes.size()
                                          << " bytes; fast: " << outcome.stop << ", " << outcome.bytes.size();

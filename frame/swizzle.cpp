@@ -1,0 +1,189 @@
+#include "frame/swizzle.h"
+
+#include "frame/lanes.h"
+#include "frame/processor.h"
+
+#if defined(__x86_64__) || defined(__i386__)
+#include <tmmintrin.h>
+#define PELM_SHUFFLES __attribute__((target("ssse3")))
+#elif defined(__ARM_NEON)
+#define PELM_SHUFFLES
+#endif
+
+namespace pelm {
+
+#ifdef PELM_SHUFFLES
+
+namespace {
+
+#if defined(__x86_64__) || defined(__i386__)
+
+using Group = __m128i; // four pixels as words
+
+PELM_SHUFFLES inline Group load(const uint8_t *from) {
+    return _mm_loadu_si128(reinterpret_cast<const __m128i *>(from));
+}
+
+PELM_SHUFFLES inline void store(uint8_t *to, Group group) {
+    _mm_storeu_si128(reinterpret_cast<__m128i *>(to), group);
+}
+
+PELM_SHUFFLES inline Group shuffle(Group group, Group places) {
+    return _mm_shuffle_epi8(group, places);
+}
+
+PELM_SHUFFLES inline Group join_halves(Group a, Group b) {
+    return _mm_unpacklo_epi64(a, b);
+}
+
+PELM_SHUFFLES inline Group set_bits(Group a, Group b) {
+    return _mm_or_si128(a, b);
+}
+
+PELM_SHUFFLES inline bool are_opaque(Group words) {
+    return (_mm_movemask_epi8(_mm_cmpeq_epi8(words, _mm_set1_epi32(-1))) & 0x8888) == 0x8888;
+}
+
+PELM_SHUFFLES inline void store_triples(uint8_t *to, Group words) {
+    store(to, _mm_shuffle_epi8(words, _mm_setr_epi8(0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -1, -1, -1, -1)));
+}
+
+PELM_SHUFFLES inline void store_rgb565(uint8_t *to, Group words) {
+    const Group red = _mm_slli_epi32(_mm_and_si128(words, _mm_set1_epi32(0xF8)), 8);
+    const Group green = _mm_srli_epi32(_mm_and_si128(words, _mm_set1_epi32(0xFC00)), 5);
+    const Group blue = _mm_srli_epi32(_mm_and_si128(words, _mm_set1_epi32(0xF80000)), 19);
+    const Group pixels = _mm_or_si128(_mm_or_si128(red, green), blue);
+    const Group packed = _mm_shuffle_epi8(pixels, _mm_setr_epi8(0, 1, 4, 5, 8, 9, 12, 13, -1, -1, -1, -1, -1, -1, -1, -1));
+    _mm_storel_epi64(reinterpret_cast<__m128i *>(to), packed);
+}
+
+#else
+
+using Group = uint8x16_t;
+
+inline Group load(const uint8_t *from) {
+    return vld1q_u8(from);
+}
+
+inline void store(uint8_t *to, Group group) {
+    vst1q_u8(to, group);
+}
+
+inline Group shuffle(Group group, Group places) {
+#if defined(__aarch64__)
+    return vqtbl1q_u8(group, places);
+#else
+    const uint8x8x2_t table = {{vget_low_u8(group), vget_high_u8(group)}};
+    return vcombine_u8(vtbl2_u8(table, vget_low_u8(places)), vtbl2_u8(table, vget_high_u8(places)));
+#endif
+}
+
+inline Group join_halves(Group a, Group b) {
+    return vcombine_u8(vget_low_u8(a), vget_low_u8(b));
+}
+
+inline Group set_bits(Group a, Group b) {
+    return vorrq_u8(a, b);
+}
+
+inline bool are_opaque(Group words) {
+    const uint32x4_t alphas = vreinterpretq_u32_u8(words);
+    const uint32x2_t both = vand_u32(vget_low_u32(alphas), vget_high_u32(alphas));
+    return (vget_lane_u32(both, 0) & vget_lane_u32(both, 1)) >> 24 == 0xFF;
+}
+
+inline void store_triples(uint8_t *to, Group words) {
+    static constexpr uint8_t places[16] = {0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, 0x80, 0x80, 0x80, 0x80};
+    store(to, shuffle(words, load(places)));
+}
+
+inline void store_rgb565(uint8_t *to, Group words) {
+    const uint32x4_t pixels = vreinterpretq_u32_u8(words);
+    const uint32x4_t red = vshlq_n_u32(vandq_u32(pixels, vdupq_n_u32(0xF8)), 8);
+    const uint32x4_t green = vshrq_n_u32(vandq_u32(pixels, vdupq_n_u32(0xFC00)), 5);
+    const uint32x4_t blue = vshrq_n_u32(vandq_u32(pixels, vdupq_n_u32(0xF80000)), 19);
+    vst1_u8(to, vreinterpret_u8_u16(vmovn_u32(vorrq_u32(vorrq_u32(red, green), blue))));
+}
+
+#endif
+
+// Four pixels of `size` bytes. Reads 16 bytes, or for the wider ones 2 x `size` and 16 more.
+template <int32_t size>
+PELM_SHUFFLES inline Group load_words(const uint8_t *from, Group places) {
+    const Group first = shuffle(load(from), places);
+    if constexpr (size <= 4) return first;
+    return join_halves(first, shuffle(load(from + 2 * size), places));
+}
+
+template <int32_t size, SwizzleTo to, bool stops_at_alpha>
+PELM_SHUFFLES int32_t swizzle_as(const Swizzle &how, const uint8_t *row, int32_t count, uint8_t *out) {
+    constexpr int32_t target_size = to == SwizzleTo::words ? 4 : to == SwizzleTo::triples ? 3 : 2;
+    constexpr int32_t bytes_read = size <= 4 ? 16 : 2 * size + 16;
+    constexpr int32_t bytes_written = to == SwizzleTo::rgb565 ? 8 : 16;
+    // Pixels that a group reads from and writes to.
+    constexpr int32_t reach = (bytes_read + size - 1) / size > (bytes_written + target_size - 1) / target_size
+                                  ? (bytes_read + size - 1) / size
+                                  : (bytes_written + target_size - 1) / target_size;
+    const Group places = load(how.places);
+    const Group ones = load(how.ones);
+    int32_t done = 0;
+    for (; done <= count - reach; done += 4) {
+        const Group words = set_bits(load_words<size>(row, places), ones);
+        if (stops_at_alpha && !are_opaque(words)) break;
+        if constexpr (to == SwizzleTo::words)
+            store(out, words);
+        else if constexpr (to == SwizzleTo::triples)
+            store_triples(out, words);
+        else
+            store_rgb565(out, words);
+        row += 4 * size;
+        out += 4 * target_size;
+    }
+    return done;
+}
+
+template <int32_t size>
+int32_t swizzle_from(const Swizzle &how, const uint8_t *row, int32_t count, uint8_t *out) {
+    switch (how.to) {
+    case SwizzleTo::words: return swizzle_as<size, SwizzleTo::words, false>(how, row, count, out);
+    case SwizzleTo::triples:
+        return how.stops_at_alpha ? swizzle_as<size, SwizzleTo::triples, true>(how, row, count, out)
+                                  : swizzle_as<size, SwizzleTo::triples, false>(how, row, count, out);
+    case SwizzleTo::rgb565:
+        return how.stops_at_alpha ? swizzle_as<size, SwizzleTo::rgb565, true>(how, row, count, out)
+                                  : swizzle_as<size, SwizzleTo::rgb565, false>(how, row, count, out);
+    }
+    return 0;
+}
+
+} // namespace
+
+bool can_swizzle() {
+    return kernels() >= Kernels::shuffles;
+}
+
+int32_t swizzle(const Swizzle &how, const uint8_t *row, int32_t count, uint8_t *out) {
+    switch (how.source_size) {
+    case 1: return swizzle_from<1>(how, row, count, out);
+    case 2: return swizzle_from<2>(how, row, count, out);
+    case 3: return swizzle_from<3>(how, row, count, out);
+    case 4: return swizzle_from<4>(how, row, count, out);
+    case 6: return swizzle_from<6>(how, row, count, out);
+    case 8: return swizzle_from<8>(how, row, count, out);
+    default: return 0;
+    }
+}
+
+#else
+
+bool can_swizzle() {
+    return false;
+}
+
+int32_t swizzle(const Swizzle &, const uint8_t *, int32_t, uint8_t *) {
+    return 0;
+}
+
+#endif
+
+} // namespace pelm
