@@ -53,7 +53,8 @@ PELM_SHUFFLES inline void store_rgb565(uint8_t *to, Group words) {
     const Group green = _mm_srli_epi32(_mm_and_si128(words, _mm_set1_epi32(0xFC00)), 5);
     const Group blue = _mm_srli_epi32(_mm_and_si128(words, _mm_set1_epi32(0xF80000)), 19);
     const Group pixels = _mm_or_si128(_mm_or_si128(red, green), blue);
-    const Group packed = _mm_shuffle_epi8(pixels, _mm_setr_epi8(0, 1, 4, 5, 8, 9, 12, 13, -1, -1, -1, -1, -1, -1, -1, -1));
+    const Group packed =
+        _mm_shuffle_epi8(pixels, _mm_setr_epi8(0, 1, 4, 5, 8, 9, 12, 13, -1, -1, -1, -1, -1, -1, -1, -1));
     _mm_storel_epi64(reinterpret_cast<__m128i *>(to), packed);
 }
 

@@ -1,8 +1,10 @@
 // Source layout x output format x direction: one row loop combines them.
 //
 // A `Load` is a source row: load(x) gives the pixel in column x, in any type that frame/pixel.h's questions have
-// answers for. Where that is nothing but bytes of the row, `channels` says which, and `row` is where they are. A store is
-// one of frame/stores.h.
+// answers for. Where that is nothing but bytes of the row, `channels` says which, and `row` is where they are. Where it
+// has a faster way than pixel by pixel, write_some<size>(from, count, out) writes as many pixels as that serves, one
+// behind the other, and returns how many. A store is one of frame/stores.h; `put_wide`, where there is one, also writes
+// up to three bytes behind the pixel.
 #pragma once
 
 #include <algorithm>
@@ -44,12 +46,30 @@ void write_run_in_groups(const Load &load, int32_t from, int32_t count, uint8_t 
     }
 }
 
+// All but the last pixels are followed by others, which are written later.
+template <class Store, class Load>
+inline void write_run_wide(const Load &load, int32_t from, int32_t count, uint8_t *__restrict out) {
+    const int32_t wide = std::max(count - 3, 0);
+    for (ptrdiff_t i = 0; i < wide; ++i)
+        Store::put_wide(out + i * Store::size, load(from + static_cast<int32_t>(i)));
+    write_run<Store>(load, from + wide, count - wide, out + ptrdiff_t{wide} * Store::size, DenseStep<Store>());
+}
+
 // Pixels one behind the other.
 template <class Store, class Load>
 inline void write_dense_run(const Load &load, int32_t from, int32_t count, uint8_t *out) {
     if constexpr (IsSwizzle<Store, Load>)
         if (can_swizzle()) return write_run_in_groups<Store>(load, from, count, out);
-    write_run<Store>(load, from, count, out, DenseStep<Store>());
+    if constexpr (requires { load.template write_some<Store::size>(from, count, out); }) {
+        const int32_t done = load.template write_some<Store::size>(from, count, out);
+        from += done;
+        count -= done;
+        out += ptrdiff_t{done} * Store::size;
+    }
+    if constexpr (requires { Store::put_wide; } && Store::size == 3)
+        write_run_wide<Store>(load, from, count, out);
+    else
+        write_run<Store>(load, from, count, out, DenseStep<Store>());
 }
 
 // Columns from .. from + count - 1, the first one to `out`, `step` bytes apart.
@@ -85,10 +105,25 @@ struct FullColourFormats {
     }
 };
 
+// The list that a load is written by: its own, or that of full colour.
+template <class Load>
+struct FormatsOf {
+    using List = FullColourFormats;
+};
+
+template <class Load>
+requires requires {
+    typename Load::Formats;
+}
+struct FormatsOf<Load> {
+    using List = typename Load::Formats;
+};
+
 // The same for a row that starts at byte `position` of a buffer: pixels that do not lie wholly inside are dropped.
-template <class Formats = FullColourFormats, class Load>
+template <class Load>
 void write_row_clipped(const OutputBuffer &buffer, int64_t position, int64_t step, uint32_t format, const Load &load,
                        int32_t from, int32_t count) {
+    using Formats = typename FormatsOf<Load>::List;
     const int32_t size = Formats::size(format);
     if (size == 0) return;
     const Run inside = clip_run(position, step, count, size, buffer.size);

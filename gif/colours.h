@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <cstring>
 
-#include "frame/write_row.h"
+#include "frame/finished.h"
 #include "gif/state.h"
 
 namespace pelm {
@@ -90,39 +90,12 @@ constexpr int32_t gif_step_unit(uint32_t format) {
     return GifFormats::size(format) == 2 ? 2 : 1;
 }
 
-// A pixel as it lies in memory, in the first `size` bytes of the word.
-struct FinishedPixel {
-    uint32_t word;
-};
-
-template <int32_t bytes>
-struct StoreFinished {
-    static constexpr int32_t size = bytes;
-    static void put(uint8_t *at, FinishedPixel pixel) { std::memcpy(at, &pixel.word, bytes); }
-};
-
-// The same formats for pixels that are finished: only their width is left of the format.
-struct FinishedFormats {
-    static constexpr int32_t size(uint32_t format) { return GifFormats::size(format); }
-
-    template <class Load>
-    static void write_row(uint32_t format, const Load &load, int32_t from, int32_t count, uint8_t *out,
-                          ptrdiff_t step) {
-        switch (size(format)) {
-        case 2: return write_run_as<StoreFinished<2>>(load, from, count, out, step);
-        case 3: return write_run_as<StoreFinished<3>>(load, from, count, out, step);
-        case 4: return write_run_as<StoreFinished<4>>(load, from, count, out, step);
-        default: return;
-        }
-    }
-};
-
 // The rows that are written: the pixels, and the list of formats that takes them.
 
 // Palette indices.
 struct IndexedRow {
     using Pixel = FinishedPixel;
-    using Formats = FinishedFormats;
+    using Formats = Finished<GifFormats>;
     const uint8_t *row;
     const uint32_t *finished;
 

@@ -2,7 +2,7 @@
 #include "frame/sampling.h"
 #include "frame/write_row.h"
 #include "png/adam7.h"
-#include "png/loads.h"
+#include "png/finished_colours.h"
 #include "png/pixels.h"
 #include "png/placing.h"
 #include "png/weighted.h"
@@ -76,11 +76,13 @@ void write_pass_row(PngDecodeState &state, uint32_t row, int64_t area) {
     if (pass > pass_count || (framed ? state.interlaceFrame == nullptr : state.output.size == 0)) return;
     const PassGrid grid = pass_grid(pass);
     const uint32_t y = row * grid.y_step + grid.y_start;
-    visit_row(state, [&](const auto &load) {
-        if (framed)
+    if (framed)
+        return visit_row(state, [&](const auto &load) {
             for (uint32_t sample = 0; sample < 4; ++sample)
                 add_to_frame(state, grid, y, sample, load);
-        else if (state.isOneToOne != 0)
+        });
+    visit_written_row(state, [&](const auto &load) {
+        if (state.isOneToOne != 0)
             write_in_place(state, grid, row, area, load);
         else
             write_centres(state, grid, y, load);

@@ -3,7 +3,7 @@
 #include <limits>
 
 #include "frame/write_row.h"
-#include "png/loads.h"
+#include "png/finished_colours.h"
 
 namespace pelm {
 
@@ -22,7 +22,7 @@ namespace {
 void write_row_as_it_is(const PngDecodeState &state, int64_t area) {
     const int32_t step = bytes_per_pixel(state.outputFormat);
     const int64_t position = row_position(state, area, state.rowsWritten);
-    visit_row(state, [&](const auto &load) {
+    visit_written_row(state, [&](const auto &load) {
         write_row_clipped(state.output, position, step, state.outputFormat, load, 0,
                           static_cast<int32_t>(state.imageWidth));
     });

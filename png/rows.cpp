@@ -4,6 +4,7 @@
 
 #include "frame/memory.h"
 #include "png/adam7.h"
+#include "png/finished_colours.h"
 #include "png/frame_buffer.h"
 #include "png/pixels.h"
 #include "png/placing.h"
@@ -25,16 +26,17 @@ bool allocate_row_buffers(PngDecodeState &state) {
     const uint64_t row = (uint64_t{state.wholeWidth} * state.bitsPerPixel + 7) / 8 + 1;
     state.rowLength = static_cast<uint32_t>(row); // wraps only where there is no memory for it
     const uint64_t two_rows = 2 * (row + state.wholeWidth);
-    const uint64_t bytes = has_row_ahead(row) ? std::max(two_rows, 3 * row) : two_rows;
-    if (state.rowBuffers == nullptr) state.rowBuffers = allocate_array<uint8_t>(bytes);
+    const uint64_t rows = has_row_ahead(row) ? std::max(two_rows, 3 * row) : two_rows;
+    if (state.rowBuffers == nullptr) state.rowBuffers = allocate_array<uint8_t>(sizeof(FinishedColours) + rows);
     return state.rowBuffers != nullptr;
 }
 
 void restart_state(PngDecodeState &state) {
     state.imageWidth = state.wholeWidth;
     state.imageHeight = state.wholeHeight;
-    state.rowNow = state.rowBuffers;
-    state.rowBefore = state.rowBuffers + state.rowLength;
+    finish_colours(state);
+    state.rowNow = state.rowBuffers + sizeof(FinishedColours);
+    state.rowBefore = state.rowNow + state.rowLength;
     state.rowAhead = has_row_ahead(state.rowLength) ? state.rowBefore + state.rowLength : nullptr;
     state.rowAheadIsDone = 0;
     state.rowFilled = 0;
@@ -63,17 +65,25 @@ bool stops_here(const PngDecodeState &state, uint32_t rows_before) {
     return rows_before < state.stopRow && state.rowsDone >= state.stopRow;
 }
 
-// Undoes the filter of the complete row in rowNow, below the reconstructed row `above`, and makes it the current one.
-// Where that is faster the following row is done with it: unseen, for its bytes come again, with rowAheadIsDone set.
+// Reconstructs the complete row in rowNow, below `above`, and the one after it in rowAhead, where that is faster than a
+// row after the other.
+bool reconstruct_two_rows(PngDecodeState &state, const uint8_t *above, const uint8_t *following) {
+    if (following == nullptr || state.rowAhead == nullptr) return false;
+    const TwoRows rows = {state.rowNow + 1,    state.rowAhead + 1, above,       state.rowLength - 1,
+                          state.bytesPerPixel, state.rowNow[0],    following[0]};
+    if (!two_rows_pay(rows)) return false;
+    std::memcpy(state.rowAhead, following, state.rowLength);
+    unfilter_two_rows(rows);
+    return true;
+}
+
+// Makes the complete row in rowNow the current one, its filter undone. Nothing of a row ahead shows: its bytes come
+// again.
 void reconstruct_row(PngDecodeState &state, const uint8_t *above, const uint8_t *following) {
     if (state.rowAheadIsDone != 0) {
         state.rowAheadIsDone = 0;
         std::swap(state.rowNow, state.rowAhead);
-    } else if (following != nullptr && state.rowAhead != nullptr &&
-               two_rows_pay(state.rowNow[0], following[0], state.bytesPerPixel)) {
-        std::memcpy(state.rowAhead, following, state.rowLength);
-        unfilter_two_rows({state.rowNow + 1, state.rowAhead + 1, above, state.rowLength - 1, state.bytesPerPixel,
-                           state.rowNow[0], following[0]});
+    } else if (reconstruct_two_rows(state, above, following)) {
         state.rowAheadIsDone = 1;
     } else {
         __PELMI_PngReadFilterRow(&state, state.rowNow + 1, above, state.rowLength - 1);

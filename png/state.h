@@ -57,8 +57,12 @@ struct PngSamplePoint {
     uint32_t x, y;
 };
 
+namespace pelm {
+struct FinishedColours;
+}
+
 // Fills the record up to the size that hosts of 32-bit systems account for.
-constexpr size_t png_state_fill = 153;
+constexpr size_t png_state_fill = 152;
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed.
 struct PngDecodeState {
@@ -92,7 +96,8 @@ struct PngDecodeState {
     uint32_t scaledHeight;
 
     // The image-data loops.
-    uint8_t *rowBuffers; // two or three rows and room, one allocation
+    uint8_t *rowBuffers; // finished colours, two or three rows and room, one allocation
+    pelm::FinishedColours *finished; // there; NULL: they are not
     uint8_t *zeroRow;    // Adam7
     pelm::InflateState inflate;
     uint8_t *rowNow; // the one being filled, filter byte first

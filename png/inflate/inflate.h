@@ -148,8 +148,8 @@ Stop take_symbols(InflateState &now, Input &input) {
     BitReader bits = now.bits;
     Stop stop = Stop::go_on;
     while (stop == Stop::go_on && !is_full(now.window)) {
-        const bool ended = now.literals.entries != nullptr && run_fast(now.literals, now.distances, bits, input.next,
-                                                                       input.end, now.window);
+        const bool ended = now.literals.entries != nullptr &&
+                           run_fast(now.literals, now.distances, bits, input.next, input.end, now.window);
         if (ended) {
             stop = end_block(now);
             break;

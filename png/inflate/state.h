@@ -56,7 +56,7 @@ struct InflateState {
     DecodingTable literals, distances; // both or none
     const LookupTables *codes;         // for what these do not say; NULL until the trees are grown
     const HuffmanNode *nodes;          // what the codes' longer ones go on in
-    BlockCodes *dynamic;             // owned; NULL until the first compressed block
+    BlockCodes *dynamic;               // owned; NULL until the first compressed block
     HuffmanNodePool *pool;             // for its trees
 };
 

@@ -1,4 +1,5 @@
-// A block's codes: decoding tables at once; trees, and the lookup tables in front of them, when something asks for them.
+// A block's codes: decoding tables at once; trees, and the lookup tables in front of them, when something asks for
+// them.
 #include "frame/memory.h"
 #include "frame/processor.h"
 #include "png/inflate/fixed_codes.h"
@@ -23,10 +24,9 @@ bool are_equal(const CodeLengths &a, const CodeLengths &b) {
 
 void make_tables(BlockCodes &codes) {
     const CodeLengths &lengths = codes.lengths;
-    codes.literals =
-        make_literal_table(lengths.lengths, lengths.literals, widest_literal_table, codes.literal_entries);
-    codes.distances = make_distance_table(lengths.lengths + lengths.literals, lengths.distances,
-                                          widest_distance_table, codes.distance_entries);
+    codes.literals = make_literal_table(lengths.lengths, lengths.literals, widest_literal_table, codes.literal_entries);
+    codes.distances = make_distance_table(lengths.lengths + lengths.literals, lengths.distances, widest_distance_table,
+                                          codes.distance_entries);
     if (codes.distances.entries == nullptr) codes.literals = {};
 }
 
