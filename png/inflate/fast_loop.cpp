@@ -44,7 +44,8 @@ inline BitReader reader_of(Bits bits, const uint8_t *&next) {
 
 } // namespace
 
-bool run_fast(const DecodingTable &literals, const DecodingTable &distances, BitReader &reader, const uint8_t *&next,
+// The tables are copies, which no write to the window can be suspected of changing.
+bool run_fast(DecodingTable literals, DecodingTable distances, BitReader &reader, const uint8_t *&next,
               const uint8_t *end, Window &window) {
     if (end - next < fast_input || is_full(window)) return false;
     Bits bits = {reader.bits, reader.count};
@@ -73,7 +74,9 @@ bool run_fast(const DecodingTable &literals, const DecodingTable &distances, Bit
             drop_entry(bits, entry);
             out = put_literals(out, entry);
             entry = look_up(literals, bits.word);
-            for (uint32_t more = 0; more < 3 && (entry & entry_is_literal) != 0; ++more) {
+#pragma GCC unroll 3
+            for (uint32_t more = 0; more < 3; ++more) {
+                if ((entry & entry_is_literal) == 0) break;
                 drop_entry(bits, entry);
                 out = put_literals(out, entry);
                 entry = look_up(literals, bits.word);

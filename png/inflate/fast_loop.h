@@ -12,7 +12,7 @@ namespace pelm {
 constexpr ptrdiff_t fast_input = 8; // bytes: what one look at the input takes
 
 // True when the block has ended.
-bool run_fast(const DecodingTable &literals, const DecodingTable &distances, BitReader &reader, const uint8_t *&next,
+bool run_fast(DecodingTable literals, DecodingTable distances, BitReader &reader, const uint8_t *&next,
               const uint8_t *end, Window &window);
 
 } // namespace pelm
