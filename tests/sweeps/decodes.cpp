@@ -4,16 +4,14 @@
 #include <cstdio>
 #include <string_view>
 
+#include "tests/sweeps/follower.h"
+
 namespace pelm::sweeps {
 namespace {
 
 using fuzz::Call;
 using fuzz::Format;
 using fuzz::Output;
-using fuzz::Progress;
-
-// More than any input needs. A PNG whose first block holds no row would be begun anew forever.
-constexpr size_t most_calls = 2000;
 
 constexpr uint64_t largest_output = 16u << 20;
 
@@ -21,76 +19,56 @@ bool is_by_lines(const Call &call) {
     return std::string_view(call.name).ends_with("Line");
 }
 
+// A decode, and what is kept of it.
 class Run {
 public:
     Run(const Decode &decode, const Setting &setting, std::span<uint8_t> output);
     Outcome to_its_end();
 
 private:
-    int32_t make(const Call &call);
-    void bring_staging_buffer();
+    void make_call();
     void keep_output();
-    void keep_and_free(void *&table);
+    void keep(const void *colour_table);
 
-    const Decode &decode_;
-    const Setting &setting_;
     const std::span<uint8_t> output_;
-    const bool has_two_steps_;
     Bytes file_; // a copy: PNG joins its chunks in memory sources
     PelmTestBytes bytes_;
-    InputSource source_{};
-    ImageDecodeInfo info_{};
+    Follower follower_;
     Outcome outcome_;
 };
 
 Run::Run(const Decode &decode, const Setting &setting, std::span<uint8_t> output)
-    : decode_(decode), setting_(setting), output_(output), has_two_steps_(decode.call->progress == Progress::parks),
-      file_(decode.input->bytes), bytes_{file_.data(), static_cast<int32_t>(file_.size()), 0} {
-    PelmTest_OpenSource(&source_, setting.kind, &bytes_, setting.buffer_size);
-    info_.input = &source_;
-    info_.outputFormat = setting.format;
-    info_.flags = setting.rotation | setting.placement | decode.flags;
-}
+    : output_(output), file_(decode.input->bytes), bytes_{file_.data(), static_cast<int32_t>(file_.size()), 0},
+      follower_(decode, setting, bytes_, output.data()) {}
 
 Outcome Run::to_its_end() {
-    const Call &next = has_two_steps_ ? fuzz::resuming_call() : *decode_.call;
-    int32_t result = make(*decode_.call);
-    while (info_.decoderState != nullptr && result != PELM_RESULT_FAILED && outcome_.replies.size() < most_calls)
-        result = make(next);
-    if (has_two_steps_) info_.decoderState = nullptr; // freed, whatever came of it
-    fuzz::give_up(decode_.input->format, info_);
-    if (result == PELM_RESULT_MORE) keep_output();
-    keep_and_free(info_.globalColorTable);
-    keep_and_free(info_.localColorTable);
+    while (!follower_.is_over())
+        make_call();
+    follower_.give_up();
+    if (follower_.result == PELM_RESULT_MORE) keep_output();
+    keep(follower_.info.globalColorTable);
+    keep(follower_.info.localColorTable);
+    follower_.free_colour_tables();
     return std::move(outcome_);
 }
 
-int32_t Run::make(const Call &call) {
-    const int32_t rows = has_two_steps_ ? 1 : setting_.rows; // 1: the divisor of the first step
-    if (call.progress == Progress::resumes) bring_staging_buffer();
-    const fuzz::Step step{0, setting_.width, setting_.height, rows, output_.data() == nullptr, false};
-    const int32_t result = call.make(&info_, output_.data(), step);
-    outcome_.replies.push_back({result, info_.outputWidth, info_.outputHeight, info_.hasTransparency, info_.frameDelay,
-                                info_.colorTableState});
+void Run::make_call() {
+    const Call &call = follower_.next_call();
+    const ImageDecodeInfo &info = follower_.info;
+    const int32_t result = follower_.make();
+    outcome_.replies.push_back(
+        {result, info.outputWidth, info.outputHeight, info.hasTransparency, info.frameDelay, info.colorTableState});
     if (call.output != Output::none && (result != PELM_RESULT_MORE || is_by_lines(call))) keep_output();
-    return result;
-}
-
-void Run::bring_staging_buffer() {
-    if (setting_.kind != PELM_SOURCE_STREAM && setting_.kind != PELM_SOURCE_STREAM_ALT) return;
-    source_.data = static_cast<uint8_t *>(ZOTARPELM_OsMalloc(static_cast<uint32_t>(source_.bufferSize)));
 }
 
 void Run::keep_output() {
     outcome_.output.insert(outcome_.output.end(), output_.begin(), output_.end());
 }
 
-void Run::keep_and_free(void *&table) {
-    if (table == nullptr) return;
-    const auto *const bytes = static_cast<const uint8_t *>(table);
+void Run::keep(const void *colour_table) {
+    if (colour_table == nullptr) return;
+    const auto *const bytes = static_cast<const uint8_t *>(colour_table);
     outcome_.colour_tables.insert(outcome_.colour_tables.end(), bytes, bytes + 1024);
-    ZOTARPELM_OsFree(table);
-    table = nullptr;
 }
 
 bool is_interlaced_png(const Input &input) {

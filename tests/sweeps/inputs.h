@@ -20,7 +20,8 @@ struct Input {
 };
 
 // Of the builders: every depth and colour type, every kind of frame; a few hundred pixels each.
-std::vector<Input> small_inputs();
+// They fit sides of 15 and more.
+std::vector<Input> small_inputs(int32_t width = 23, int32_t height = 19);
 
 // Of some tens to a few hundred bytes.
 std::vector<Input> tiny_inputs();
