@@ -66,7 +66,7 @@ TEST(Threads, decodes_on_eight_threads_come_out_as_they_do_alone) {
     std::vector<Job> jobs;
     ASSERT_NO_FATAL_FAILURE(add_jobs(jobs, small, by_extent(7u, 1u, 1u)));
     ASSERT_NO_FATAL_FAILURE(add_jobs(jobs, samples, by_extent(13u, 2u, 2u)));
-    RecordProperty("decodes", static_cast<int>(jobs.size() * thread_count));
+    tell_count("threads", jobs.size() * thread_count);
     EXPECT_GE(jobs.size() * thread_count, by_extent(4000u, 20000u, 20000u));
 
     std::string findings[thread_count];
