@@ -11,6 +11,7 @@
 #include "tests/bounds/ways.h"
 #include "tests/bounds/work.h"
 #include "tests/gif/support/gif_blocks.h"
+#include "tests/png/support/png_builder.h"
 
 namespace pelm::test {
 namespace {
@@ -40,10 +41,6 @@ std::vector<Sample> samples() {
 struct Size {
     uint32_t width, height;
 };
-
-uint32_t read_u32be(const uint8_t *bytes) {
-    return uint32_t{bytes[0]} << 24 | uint32_t{bytes[1]} << 16 | uint32_t{bytes[2]} << 8 | bytes[3];
-}
 
 Blocks bmp_blocks(const Bytes &file, uint32_t kind, Way way, uint32_t scaled_width, int32_t calls) {
     const uint32_t width = read_u32le(&file[18]), bits = read_u16le(&file[28]), offset = read_u32le(&file[10]);

@@ -234,6 +234,10 @@ Bytes file_of(const std::vector<Chunk> &chunks) {
 }
 
 // PNG specification, annex D: the plain definition, bit by bit through one small table.
+uint32_t read_u32be(const uint8_t *bytes) {
+    return uint32_t{bytes[0]} << 24 | uint32_t{bytes[1]} << 16 | uint32_t{bytes[2]} << 8 | bytes[3];
+}
+
 uint32_t crc32_of(const Bytes &bytes) {
     static const std::vector<uint32_t> table = [] {
         std::vector<uint32_t> entries(256);

@@ -91,5 +91,6 @@ Bytes bytes_of(const Chunk &chunk);
 inline constexpr uint8_t png_signature[8] = {0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0A};
 
 uint32_t crc32_of(const Bytes &bytes);
+uint32_t read_u32be(const uint8_t *bytes);
 
 } // namespace pelm::test
