@@ -15,8 +15,8 @@ OutputRow next_output_row(const GifDecoderState &state, intptr_t start) {
 void write_whole_row(GifDecoderState &state, intptr_t start) {
     const OutputRow row = next_output_row(state, start);
     write_row_clipped(state.output, row.position, row.step, state.outputFormat,
-                                       IndexedRow{state.pixelBuffer, finished_colours(state)}, 0,
-                                       std::min(state.imageWidth, state.requestedWidth));
+                      IndexedRow{state.pixelBuffer, finished_colours(state)}, 0,
+                      std::min(state.imageWidth, state.requestedWidth));
 }
 
 void write_sampled_row(GifDecoderState &state, intptr_t start) {
