@@ -19,8 +19,7 @@ void write_one_to_one(const GifDecoderState &state, intptr_t start, const Load &
     if (state.sourceRow >= state.screenHeight) return;
     const OutputRow row = output_row(state, start, state.sourceRow);
     const int64_t step = always_steps_forward(state.outputFormat) ? 4 : row.step;
-    write_row_clipped(state.output, row.position, step, state.outputFormat, load, 0,
-                                              state.screenWidth);
+    write_row_clipped(state.output, row.position, step, state.outputFormat, load, 0, state.screenWidth);
 }
 
 // The output rows that show the screen's row: none or one, and several where the image is enlarged.

@@ -44,8 +44,7 @@ void write_samples(const GifDecoderState &state, int64_t position, int64_t step,
             gathered[count] = load(static_cast<int32_t>(column.at));
             column.advance();
         }
-        write_row_clipped(state.output, position, step, state.outputFormat,
-                                                  GatheredRow<Load>{gathered}, 0, count);
+        write_row_clipped(state.output, position, step, state.outputFormat, GatheredRow<Load>{gathered}, 0, count);
         done += count;
         position += count * step;
     }

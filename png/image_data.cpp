@@ -12,12 +12,7 @@ namespace pelm {
 namespace {
 
 // Where the next call comes back to. The places within a block differ only in name: the core's record knows the rest.
-enum : uint32_t {
-    resume_in_stored = 1,
-    resume_at_symbol = 2,
-    resume_at_row = 4,
-    resume_at_block = 5
-};
+enum : uint32_t { resume_in_stored = 1, resume_at_symbol = 2, resume_at_row = 4, resume_at_block = 5 };
 
 uint32_t place_within_block(Step step) {
     switch (step) {

@@ -96,9 +96,9 @@ struct PngDecodeState {
     uint32_t scaledHeight;
 
     // The image-data loops.
-    uint8_t *rowBuffers; // finished colours, two or three rows and room, one allocation
+    uint8_t *rowBuffers;             // finished colours, two or three rows and room, one allocation
     pelm::FinishedColours *finished; // there; NULL: they are not
-    uint8_t *zeroRow;    // Adam7
+    uint8_t *zeroRow;                // Adam7
     pelm::InflateState inflate;
     uint8_t *rowNow; // the one being filled, filter byte first
     uint8_t *rowBefore;
