@@ -1,5 +1,7 @@
 #include "frame/swizzle.h"
 
+#include <cstring>
+
 #include "frame/lanes.h"
 #include "frame/processor.h"
 
@@ -44,8 +46,8 @@ PELM_SHUFFLES inline bool are_opaque(Group words) {
     return (_mm_movemask_epi8(_mm_cmpeq_epi8(words, _mm_set1_epi32(-1))) & 0x8888) == 0x8888;
 }
 
-PELM_SHUFFLES inline void store_triples(uint8_t *to, Group words) {
-    store(to, _mm_shuffle_epi8(words, _mm_setr_epi8(0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -1, -1, -1, -1)));
+PELM_SHUFFLES inline Group triples_of(Group words) {
+    return _mm_shuffle_epi8(words, _mm_setr_epi8(0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -1, -1, -1, -1));
 }
 
 PELM_SHUFFLES inline void store_rgb565(uint8_t *to, Group words) {
@@ -93,9 +95,9 @@ inline bool are_opaque(Group words) {
     return (vget_lane_u32(both, 0) & vget_lane_u32(both, 1)) >> 24 == 0xFF;
 }
 
-inline void store_triples(uint8_t *to, Group words) {
+inline Group triples_of(Group words) {
     static constexpr uint8_t places[16] = {0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, 0x80, 0x80, 0x80, 0x80};
-    store(to, shuffle(words, load(places)));
+    return shuffle(words, load(places));
 }
 
 inline void store_rgb565(uint8_t *to, Group words) {
@@ -116,6 +118,13 @@ PELM_SHUFFLES inline Group load_words(const uint8_t *from, Group places) {
     return join_halves(first, shuffle(load(from + 2 * size), places));
 }
 
+// The pixels behind these may be blended with what lies there: nothing of it is written.
+PELM_SHUFFLES inline void store_12(uint8_t *to, Group group) {
+    uint8_t bytes[16];
+    store(bytes, group);
+    std::memcpy(to, bytes, 12);
+}
+
 template <int32_t size, SwizzleTo to, bool stops_at_alpha>
 PELM_SHUFFLES int32_t swizzle_as(const Swizzle &how, const uint8_t *row, int32_t count, uint8_t *out) {
     constexpr int32_t target_size = to == SwizzleTo::words ? 4 : to == SwizzleTo::triples ? 3 : 2;
@@ -134,7 +143,7 @@ PELM_SHUFFLES int32_t swizzle_as(const Swizzle &how, const uint8_t *row, int32_t
         if constexpr (to == SwizzleTo::words)
             store(out, words);
         else if constexpr (to == SwizzleTo::triples)
-            store_triples(out, words);
+            stops_at_alpha ? store_12(out, triples_of(words)) : store(out, triples_of(words));
         else
             store_rgb565(out, words);
         row += 4 * size;

@@ -11,6 +11,7 @@
 #include "tests/bounds/ways.h"
 #include "tests/bounds/work.h"
 #include "tests/gif/support/gif_blocks.h"
+#include "tests/png/support/memory.h"
 #include "tests/png/support/png_builder.h"
 
 namespace pelm::test {
@@ -70,8 +71,9 @@ Blocks png_blocks(const Bytes &file, Size size, uint32_t kind, uint32_t scaled_w
     Blocks blocks{sizeof(PngDecodeState), sizeof(PngInputBuffer)};
     if (kind != PELM_SOURCE_MEMORY) blocks.push_back(16384);
     if (file[25] == 3) blocks.insert(blocks.end(), {768, 2 * read_u32be(&file[33])});
-    blocks.insert(blocks.end(), {2048 * sizeof(PngIdatEntry), 4 * size.width, 4 * scaled_width, 50008,
-                                 2 * (row + size.width), 98608, sizeof(BlockCodes)});
+    blocks.insert(blocks.end(),
+                  {2048 * sizeof(PngIdatEntry), 4 * size.width, 4 * scaled_width, 50008,
+                   static_cast<uint32_t>(row_buffer_bytes(row, size.width)), window_bytes, sizeof(BlockCodes)});
     return blocks;
 }
 

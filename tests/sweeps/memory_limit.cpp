@@ -8,6 +8,7 @@
 #include "frame/bytes.h"
 #include "png/state.h"
 #include "tests/gif/support/gif_blocks.h"
+#include "tests/png/support/memory.h"
 #include "tests/png/support/png_builder.h"
 
 namespace pelm::sweeps {
@@ -62,14 +63,14 @@ uint64_t png_limit(const Decode &decode, const uint8_t *bytes, const ImageDecode
     const uint64_t scaled_width = static_cast<uint32_t>(info.outputWidth);
     const uint64_t scaled_height = static_cast<uint32_t>(info.outputHeight);
     const uint64_t reader = sizeof(PngDecodeState) + sizeof(PngInputBuffer) + 16384;
-    constexpr uint64_t window = 98608, pool = 50008, tables = sizeof(void *) == 4 ? 20828 : 20848;
+    constexpr uint64_t pool = 50008, tables = sizeof(void *) == 4 ? 20828 : 20848;
     const uint64_t palette = 768 + 2 * 768;
     const uint64_t index = 2048 * sizeof(PngIdatEntry);
-    const uint64_t rows = 2 * ((width * bits + 7) / 8 + 1 + width);
+    const uint64_t rows = test::row_buffer_bytes((width * bits + 7) / 8 + 1, width);
     const bool is_interlaced = bytes[28] != 0;
     const uint64_t frame = is_interlaced && decode.flags != 0 ? 4 * scaled_width * scaled_height : 0;
     const uint64_t sums = is_interlaced ? frame + 8 * width : 4 * width + 4 * scaled_width;
-    return reader + palette + index + rows + sums + window + 2 * pool + tables;
+    return reader + palette + index + rows + sums + test::window_bytes + 2 * pool + tables;
 }
 
 uint64_t gif_limit(const Decode &decode, const uint8_t *bytes) {
