@@ -29,7 +29,7 @@ void write_bits(const uint8_t *row, int32_t width, uint8_t *__restrict out) {
     for (int32_t i = 0; i < whole; ++i, out += 8 * pixel_bytes)
         std::memcpy(out, pixels_of[row[i]], 8 * pixel_bytes);
     const int32_t rest = width % 8;
-    if (rest != 0) std::memcpy(out, pixels_of[row[whole]], static_cast<size_t>(rest * pixel_bytes));
+    if (rest != 0) std::memcpy(out, pixels_of[row[whole]], static_cast<size_t>(rest) * size_t{pixel_bytes});
 }
 
 template <int32_t pixel_bytes>
