@@ -1,4 +1,6 @@
 // Blocks with codes of their own: incomplete, empty and over-subscribed ones, and how their lengths are sent.
+#include <algorithm>
+
 #include <gtest/gtest.h>
 
 #include "tests/png/inner/inflating.h"
@@ -54,6 +56,37 @@ TEST(Inflate, over_subscribed_codes_decode_as_their_tree_says) {
     Deflate deflate;
     deflate.dynamic(codes, {literal('b'), literal('b'), literal('a')}, Last::yes, EndOfBlock::left_out);
     expect_inflates_to(zlib_stream(deflate), text_bytes("bb"));
+}
+
+// Whether the code that no block uses still says what the test has made it say.
+TEST(Inflate, a_block_with_the_code_lengths_of_the_one_before_is_decoded_by_its_tables) {
+    const Tokens text = literals(text_bytes("some text"));
+    Tokens longer = text;
+    longer.push_back(literal('Z'));
+    const DynamicCodes codes = codes_for(longer);
+    Deflate deflate;
+    deflate.dynamic(codes, text, Last::no);
+    deflate.dynamic(codes, text, Last::no);
+    deflate.fixed(text, Last::no);
+    deflate.dynamic(codes, text, Last::no);
+    deflate.dynamic(codes_for(text), text, Last::yes);
+    Inflater inflater(zlib_stream(deflate), {.pause_at_blocks = true});
+    ASSERT_EQ(inflater.call(), Stop::block_ended);
+    BlockCodes &made = *inflater.state.dynamic;
+    uint32_t *const end = made.literal_entries + (1u << made.literals.width);
+    uint32_t *const of_z = std::find_if(made.literal_entries, end, [](uint32_t entry) {
+        return (entry & entry_is_literal) != 0 && (entry >> 8 & 0xFF) == 'Z';
+    });
+    ASSERT_NE(of_z, end);
+    const uint32_t marked = *of_z ^ 0x100;
+    *of_z = marked;
+    for (int block = 2; block <= 4; ++block) {
+        ASSERT_EQ(inflater.call(), Stop::block_ended);
+        EXPECT_EQ(*of_z, marked) << "block " << block;
+    }
+    EXPECT_EQ(inflater.call(), Stop::finished);
+    EXPECT_NE(*of_z, marked) << "other code lengths";
+    EXPECT_EQ(inflater.rows.bytes.size(), 5 * text.size());
 }
 
 namespace {

@@ -63,22 +63,28 @@ TEST(Match, every_distance_is_reached) {
     expect_matches(before, tokens);
 }
 
-TEST(Match, across_the_windows_end_from_every_place_before_it) {
-    for (const uint32_t distance : {1u, 2u, 3u, 258u, 300u, 32767u, 32768u})
-        for (size_t before_end = 0; before_end <= 260; before_end += before_end < 8 ? 1 : 36) {
-            const Bytes before = noise_bytes(2 * 32768 - before_end, 3);
-            ASSERT_NO_FATAL_FAILURE(expect_matches(before, {match(258, distance), literal(1), match(258, distance)}))
-                << "distance " << distance << ", " << before_end << " bytes before the end";
-        }
+// Where the window is full for the first and the second time, and nowhere in particular.
+constexpr size_t window_ends[] = {2 * window_size, window_full, window_full + window_room};
+
+TEST(Match, across_the_windows_ends_from_every_place_before_them) {
+    for (const size_t end : window_ends)
+        for (const uint32_t distance : {1u, 2u, 3u, 258u, 300u, 32767u, 32768u})
+            for (size_t before_end = 0; before_end <= 260; before_end += before_end < 3 ? 1 : 85) {
+                const Bytes before = noise_bytes(end - before_end, 3);
+                ASSERT_NO_FATAL_FAILURE(
+                    expect_matches(before, {match(258, distance), literal(1), match(258, distance)}))
+                    << "distance " << distance << ", " << before_end << " bytes before " << end;
+            }
 }
 
-TEST(Match, whose_source_crosses_the_windows_end) {
-    for (size_t behind_end = 0; behind_end <= 260; behind_end += behind_end < 8 ? 1 : 36) {
-        const Bytes before = noise_bytes(32768 + behind_end, 4);
-        for (uint32_t distance = 1; distance <= 520; distance += 13)
-            ASSERT_NO_FATAL_FAILURE(expect_matches(before, {match(258, distance)}))
-                << "distance " << distance << ", " << behind_end << " bytes behind the end";
-    }
+TEST(Match, whose_source_crosses_the_windows_ends) {
+    for (const size_t end : window_ends)
+        for (size_t behind_end = 0; behind_end <= 260; behind_end += behind_end < 3 ? 1 : 85) {
+            const Bytes before = noise_bytes(end + behind_end, 4);
+            for (uint32_t distance = 1; distance <= 520; distance += 29)
+                ASSERT_NO_FATAL_FAILURE(expect_matches(before, {match(258, distance)}))
+                    << "distance " << distance << ", " << behind_end << " bytes behind " << end;
+        }
 }
 
 TEST(Match, beyond_the_beginning_gives_the_first_byte_until_the_distance_is_reached) {
