@@ -1,7 +1,7 @@
 // How decoding tables are made (png/inflate/decoding_table.h): from code lengths, each entry written once.
 #pragma once
 
-#include <bit>
+#include <array>
 
 #include "png/inflate/alphabets.h"
 #include "png/inflate/decoding_table.h"
@@ -15,58 +15,105 @@ constexpr uint32_t largest_alphabet = 288;
 // stream: first bit lowest.
 struct SortedCodes {
     uint32_t begin[longest_code + 2]; // of the symbols of each length; behind the last one, all of them
-    uint16_t symbols[largest_alphabet];
+    uint16_t symbols[largest_alphabet + 1];
     uint16_t codes[largest_alphabet];
     uint32_t longest; // 0: there are no codes
     bool complete;    // every string of bits begins with a code
 };
 
-// The code behind `code` of as many bits.
-constexpr uint32_t next_code(uint32_t code, uint32_t length) {
-    const uint32_t zeros = ~code & ((1u << length) - 1);
-    const uint32_t highest = zeros == 0 ? 0 : std::bit_floor(zeros);
-    return highest == 0 ? 0 : (code & (highest - 1)) | highest;
+// The bits of a byte in the opposite order.
+inline constexpr auto reversed_bytes = [] {
+    std::array<uint8_t, 256> reversed{};
+    for (uint32_t byte = 0; byte < 256; ++byte)
+        for (uint32_t bit = 0; bit < 8; ++bit)
+            if ((byte >> bit & 1) != 0) reversed[byte] = static_cast<uint8_t>(reversed[byte] | 0x80u >> bit);
+    return reversed;
+}();
+
+constexpr uint16_t reversed_code(uint32_t code, uint32_t length) {
+    const uint32_t word = static_cast<uint32_t>(reversed_bytes[code & 0xFF]) << 8 | reversed_bytes[code >> 8];
+    return static_cast<uint16_t>(word >> (16 - length));
+}
+
+// The alphabet is sorted in parts side by side: within one, each symbol waits for the counters of the one before it.
+constexpr uint32_t sorted_parts = 4;
+
+struct LengthCounters {
+    uint32_t of[sorted_parts][longest_code + 1];
+};
+
+// visit(counters of the part, symbol), each part's symbols in order.
+template <class Visit>
+constexpr void visit_parts(uint32_t count, LengthCounters &counters, Visit &&visit) {
+    const uint32_t part = (count + sorted_parts - 1) / sorted_parts;
+    for (uint32_t i = 0; i < part; ++i)
+        for (uint32_t k = 0; k < sorted_parts; ++k)
+            if (k * part + i < count) visit(counters.of[k], k * part + i);
 }
 
 // False when there are more codes than fit their lengths.
 constexpr bool sort_codes(const uint8_t *code_lengths, uint32_t count, SortedCodes &sorted) {
-    uint32_t of_length[longest_code + 1] = {};
-    for (uint32_t symbol = 0; symbol < count; ++symbol)
-        ++of_length[code_lengths[symbol]];
-    uint32_t next[longest_code + 1] = {};
+    LengthCounters counters{};
+    visit_parts(count, counters, [&](uint32_t *of_length, uint32_t symbol) { ++of_length[code_lengths[symbol]]; });
     int32_t left = 1; // codes of the length that are not taken
     sorted.begin[0] = sorted.begin[1] = 0;
     sorted.longest = 0;
     for (uint32_t length = 1; length <= longest_code; ++length) {
-        left = 2 * left - static_cast<int32_t>(of_length[length]);
+        uint32_t next = sorted.begin[length];
+        for (uint32_t k = 0; k < sorted_parts; ++k) {
+            const uint32_t here = counters.of[k][length];
+            counters.of[k][length] = next; // from here on: where the part's next symbol goes
+            next += here;
+        }
+        left = 2 * left - static_cast<int32_t>(next - sorted.begin[length]);
         if (left < 0) return false;
-        next[length] = sorted.begin[length];
-        sorted.begin[length + 1] = sorted.begin[length] + of_length[length];
-        if (of_length[length] != 0) sorted.longest = length;
+        sorted.begin[length + 1] = next;
+        if (next != sorted.begin[length]) sorted.longest = length;
     }
     sorted.complete = left == 0;
-    for (uint32_t symbol = 0; symbol < count; ++symbol)
-        if (code_lengths[symbol] != 0) sorted.symbols[next[code_lengths[symbol]]++] = static_cast<uint16_t>(symbol);
+    // Symbols without a code all go where nobody looks.
+    for (uint32_t k = 0; k < sorted_parts; ++k)
+        counters.of[k][0] = sorted.begin[longest_code + 1];
+    visit_parts(count, counters, [&](uint32_t *next, uint32_t symbol) {
+        const uint32_t length = code_lengths[symbol];
+        sorted.symbols[next[length]] = static_cast<uint16_t>(symbol);
+        next[length] += length != 0 ? 1 : 0;
+    });
     uint32_t code = 0;
-    for (uint32_t length = 1; length <= sorted.longest; ++length)
-        for (uint32_t i = sorted.begin[length]; i < sorted.begin[length + 1]; ++i) {
-            sorted.codes[i] = static_cast<uint16_t>(code);
-            code = next_code(code, length);
-        }
+    for (uint32_t length = 1; length <= sorted.longest; ++length, code <<= 1)
+        for (uint32_t i = sorted.begin[length]; i < sorted.begin[length + 1]; ++i)
+            sorted.codes[i] = reversed_code(code++, length);
     return true;
 }
 
-// What the table says of a symbol whose code has `length` bits.
+// What the table says of a symbol, but for the length of its code: that counts `per_bit` for each bit.
+struct SymbolEntry {
+    uint32_t entry, per_bit;
+};
+
 template <HuffmanAlphabetKind kind>
-constexpr uint32_t entry_of(uint32_t symbol, uint32_t length) {
+constexpr SymbolEntry make_symbol_entry(uint32_t symbol) {
     constexpr uint32_t exceptional = kind == HUFFMAN_DISTANCE ? exceptional_distance : exceptional_literal;
     const Payload payload = payload_of(kind, symbol);
     if (kind != HUFFMAN_DISTANCE && payload.op == HUFFMAN_LITERAL)
-        return entry_is_literal | length << 26 | 1u << 24 | payload.value << 8 | length;
-    if (payload.op == HUFFMAN_END_OF_BLOCK) return exceptional | entry_ends_block | length;
+        return {entry_is_literal | 1u << 24 | payload.value << 8, 1u << 26 | 1};
+    if (payload.op == HUFFMAN_END_OF_BLOCK) return {exceptional | entry_ends_block, 1};
     const bool is_base = payload.op >= HUFFMAN_BASE && payload.op < HUFFMAN_INVALID && payload.value != 0;
-    if (!is_base) return exceptional;
-    return payload.value << 16 | length << 8 | (length + payload.op - HUFFMAN_BASE);
+    if (!is_base) return {exceptional, 0};
+    return {payload.value << 16 | (payload.op - HUFFMAN_BASE), 1u << 8 | 1};
+}
+
+template <HuffmanAlphabetKind kind>
+inline constexpr auto symbol_entries = [] {
+    std::array<SymbolEntry, kind == HUFFMAN_DISTANCE ? 32 : largest_alphabet> entries{};
+    for (uint32_t symbol = 0; symbol < entries.size(); ++symbol)
+        entries[symbol] = make_symbol_entry<kind>(symbol);
+    return entries;
+}();
+
+template <HuffmanAlphabetKind kind>
+constexpr uint32_t entry_of(uint32_t symbol, uint32_t length) {
+    return symbol_entries<kind>[symbol].entry + length * symbol_entries<kind>[symbol].per_bit;
 }
 
 // The same as the second one of two literals: added to the entry of the first.
