@@ -1,4 +1,4 @@
-// BMP: 12 megapixels pixel for pixel, against memcpy of the output and stb_image, and reduced to a small box.
+// BMP of every depth, against memcpy of the output and stb_image.
 #pragma once
 
 namespace bench {

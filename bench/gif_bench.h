@@ -1,4 +1,4 @@
-// GIF against giflib and stb_image.
+// GIF, stills and animations, against giflib and stb_image.
 #pragma once
 
 namespace bench {

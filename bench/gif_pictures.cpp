@@ -1,8 +1,8 @@
 #include "bench/gif_pictures.h"
 
-#include <algorithm>
-
 #include <gif_lib.h>
+
+#include "bench/dither.h"
 
 namespace bench {
 namespace {
@@ -19,41 +19,41 @@ int on_write(GifFileType *gif, const GifByteType *bytes, int count) {
     return count;
 }
 
-// 3, 3 and 2 bits of red, green and blue; or black and white.
+// The common one, or black and white.
 ColorMapObject *colour_map(Colours colours) {
     ColorMapObject *const map = GifMakeMapObject(colours == Colours::two ? 2 : 256, nullptr);
     if (map == nullptr) return nullptr;
     for (int i = 0; i < map->ColorCount; ++i) {
-        const auto part = [i](int shift, int most) {
-            return static_cast<GifByteType>((i >> shift & most) * 255 / most);
-        };
-        map->Colors[i] = {part(5, 7), part(2, 7), part(0, 3)};
-        if (colours == Colours::two) map->Colors[i] = {part(0, 1), part(0, 1), part(0, 1)};
+        const Colour colour = colour_of(static_cast<uint8_t>(colours == Colours::two ? -i : i));
+        map->Colors[i] = {colour.r, colour.g, colour.b};
     }
     return map;
 }
 
-// A threshold from 0 to 15 that spreads over 4 x 4 pixels.
-int threshold_at(uint32_t x, uint32_t y) {
-    constexpr int pattern[4][4] = {{0, 8, 2, 10}, {12, 4, 14, 6}, {3, 11, 1, 9}, {15, 7, 13, 5}};
-    return pattern[y % 4][x % 4];
+uint8_t index_of(Pixel pixel, Colours colours, Dither &dither, uint32_t x) {
+    if (colours == Colours::two) return pixel.g >= 128 ? 1 : 0;
+    return colours == Colours::dithered ? dither.index_of(x, pixel) : nearest_index(pixel);
 }
 
-uint8_t index_of(const uint8_t *rgb, Colours colours, int threshold) {
-    if (colours == Colours::two) return rgb[1] >= 128 ? 1 : 0;
-    const auto level = [&](int value, int most) { return (value * most + 255 * threshold / 16) / 255; };
-    return static_cast<uint8_t>(level(rgb[0], 7) << 5 | level(rgb[1], 7) << 2 | level(rgb[2], 3));
-}
-
-Bytes index_row(Motif motif, Colours colours, uint32_t y, uint32_t first_x, uint32_t width) {
-    const Bytes rgb = rgb_row(motif, y, first_x, width);
-    Bytes row;
-    for (uint32_t x = 0; x < width; ++x) {
-        const int threshold = colours == Colours::dithered ? threshold_at(x, y) : 8;
-        row.push_back(index_of(&rgb[3 * x], colours, threshold));
+// Rows of one frame, from the top: the picture from (left, top) on.
+class IndexRows {
+public:
+    IndexRows(Motif motif, Colours colours, uint32_t left, uint32_t top, uint32_t width)
+        : motif_(motif), colours_(colours), left_(left), y_(top), width_(width), dither_(width) {}
+    Bytes next() {
+        Bytes row(width_);
+        for (uint32_t x = 0; x < width_; ++x)
+            row[x] = index_of(pixel_of(motif_, left_ + x, y_), colours_, dither_, x);
+        ++y_;
+        return row;
     }
-    return row;
-}
+
+private:
+    Motif motif_;
+    Colours colours_;
+    uint32_t left_, y_, width_;
+    Dither dither_;
+};
 
 class Writer {
 public:
@@ -106,8 +106,9 @@ Bytes with_gaps(Bytes row, uint8_t transparent) {
 std::vector<uint8_t> gif_picture(Motif motif, Colours colours, uint32_t width, uint32_t height) {
     Writer writer(width, height, colours);
     writer.add_image({0, 0, width, height});
+    IndexRows rows(motif, colours, 0, 0, width);
     for (uint32_t y = 0; y < height; ++y)
-        writer.add_row(index_row(motif, colours, y, 0, width));
+        writer.add_row(rows.next());
     return writer.finished();
 }
 
@@ -116,8 +117,9 @@ std::vector<uint8_t> gif_of_full_frames(Motif motif, uint32_t width, uint32_t he
     for (uint32_t i = 0; i < frames; ++i) {
         writer.add_control(NO_TRANSPARENT_COLOR);
         writer.add_image({0, 0, width, height});
+        IndexRows rows(motif, Colours::dithered, 17 * i, 3 * i, width);
         for (uint32_t y = 0; y < height; ++y)
-            writer.add_row(index_row(motif, Colours::dithered, y + 3 * i, 17 * i, width));
+            writer.add_row(rows.next());
     }
     return writer.finished();
 }
@@ -130,8 +132,9 @@ std::vector<uint8_t> gif_of_small_changes(Motif motif, uint32_t width, uint32_t 
         const Area area = i == 0 ? Area{0, 0, width, height} : small;
         writer.add_control(transparent);
         writer.add_image(area);
+        IndexRows rows(motif, Colours::nearest, 7 * i, 5 * i, area.width);
         for (uint32_t y = 0; y < area.height; ++y) {
-            Bytes row = index_row(motif, Colours::nearest, y + 5 * i, 7 * i, area.width);
+            Bytes row = rows.next();
             writer.add_row(i == 0 ? row : with_gaps(std::move(row), transparent));
         }
     }

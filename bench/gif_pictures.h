@@ -1,15 +1,15 @@
-// Large GIFs made at start from the pictures of the PNG benchmarks, written by giflib.
+// Large GIFs made at start from the motifs of the PNG benchmarks, written by giflib.
 #pragma once
 
 #include <cstdint>
 #include <vector>
 
-#include "bench/png_pictures.h"
+#include "bench/motifs.h"
 
 namespace bench {
 
 enum class Colours {
-    dithered, // 256, in a pattern that keeps strings short
+    dithered, // 256, with error diffusion
     nearest,  // 256
     two       // black and white
 };

@@ -1,9 +1,11 @@
-#include "bench/giflib_peer.h"
+#include "bench/peers.h"
 
 #include <algorithm>
 #include <cstring>
 
 #include <gif_lib.h>
+
+#include "bench/row_reducer.h"
 
 namespace bench {
 namespace {
@@ -22,34 +24,27 @@ int on_read(GifFileType *gif, GifByteType *to, int count) {
     return static_cast<int>(got);
 }
 
-uint32_t pack(const GifColorType &c, uint32_t) {
+uint32_t pack(const GifColorType &c) {
     return 0xFF000000u | uint32_t{c.Blue} << 16 | uint32_t{c.Green} << 8 | c.Red;
 }
 
-uint16_t pack(const GifColorType &c, uint16_t) {
-    return static_cast<uint16_t>(c.Red >> 3 << 11 | c.Green >> 2 << 5 | c.Blue >> 3);
-}
-
 // What one frame is painted with.
-template <class Pixel>
 struct Brush {
-    Pixel colours[256];
+    uint32_t colours[256];
     int transparent;
     std::vector<uint8_t> line;
 };
 
-template <class Pixel>
-bool prepare(Brush<Pixel> &brush, const GifFileType &gif) {
+bool prepare(Brush &brush, const GifFileType &gif) {
     const ColorMapObject *const map = gif.Image.ColorMap != nullptr ? gif.Image.ColorMap : gif.SColorMap;
     if (map == nullptr) return false;
     for (int i = 0; i < map->ColorCount; ++i)
-        brush.colours[i] = pack(map->Colors[i], Pixel{});
+        brush.colours[i] = pack(map->Colors[i]);
     brush.line.resize(static_cast<size_t>(gif.Image.Width));
     return true;
 }
 
-template <class Pixel>
-void paint_line(const Brush<Pixel> &brush, Pixel *to) {
+void paint_line(const Brush &brush, uint32_t *to) {
     const size_t width = brush.line.size();
     if (brush.transparent == NO_TRANSPARENT_COLOR) {
         for (size_t x = 0; x < width; ++x)
@@ -61,12 +56,11 @@ void paint_line(const Brush<Pixel> &brush, Pixel *to) {
 }
 
 // Frames that reach beyond the screen are refused: the pictures here have none.
-template <class Pixel>
-bool paint_frame(GifFileType &gif, int transparent, Pixel *screen) {
+bool paint_frame(GifFileType &gif, int transparent, uint32_t *screen) {
     if (DGifGetImageDesc(&gif) != GIF_OK) return false;
     const GifImageDesc &place = gif.Image;
     if (place.Left + place.Width > gif.SWidth || place.Top + place.Height > gif.SHeight) return false;
-    static Brush<Pixel> brush;
+    static Brush brush;
     brush.transparent = transparent;
     if (!prepare(brush, gif)) return false;
     static constexpr struct { int first, step; } passes[] = {{0, 8}, {4, 8}, {2, 4}, {1, 2}, {0, 1}};
@@ -93,20 +87,19 @@ bool read_extension(GifFileType &gif, int &transparent) {
     return true;
 }
 
-template <class Pixel>
-bool run_first(GifFileType &gif, Pixel *output) {
+// Up to its image.
+bool reach_first(GifFileType &gif) {
     int ignored = NO_TRANSPARENT_COLOR;
     for (GifRecordType record = UNDEFINED_RECORD_TYPE; record != TERMINATE_RECORD_TYPE;) {
         if (DGifGetRecordType(&gif, &record) != GIF_OK) return false;
         if (record == EXTENSION_RECORD_TYPE && !read_extension(gif, ignored)) return false;
-        if (record == IMAGE_DESC_RECORD_TYPE) return paint_frame(gif, NO_TRANSPARENT_COLOR, output);
+        if (record == IMAGE_DESC_RECORD_TYPE) return true;
     }
     return false;
 }
 
-template <class Pixel>
-bool run_all(GifFileType &gif, Pixel *output) {
-    std::vector<Pixel> screen(static_cast<size_t>(gif.SWidth) * static_cast<size_t>(gif.SHeight));
+bool run_all(GifFileType &gif, uint32_t *output) {
+    std::vector<uint32_t> screen(static_cast<size_t>(gif.SWidth) * static_cast<size_t>(gif.SHeight));
     int transparent = NO_TRANSPARENT_COLOR;
     for (GifRecordType record = UNDEFINED_RECORD_TYPE; record != TERMINATE_RECORD_TYPE;) {
         if (DGifGetRecordType(&gif, &record) != GIF_OK) return false;
@@ -118,31 +111,55 @@ bool run_all(GifFileType &gif, Pixel *output) {
     return true;
 }
 
-template <class Pixel>
-bool run(GifFileType &gif, bool all_frames, uint8_t *output) {
-    auto *const pixels = reinterpret_cast<Pixel *>(output);
-    return all_frames ? run_all(gif, pixels) : run_first(gif, pixels);
+// Into RGB565, row by row: colours are looked up only for rows with samples.
+bool run_reduced(GifFileType &gif, Box box, uint8_t *output) {
+    RowReducer reducer(static_cast<uint32_t>(gif.Image.Width), static_cast<uint32_t>(gif.Image.Height), box, output);
+    const ColorMapObject *const map = gif.Image.ColorMap != nullptr ? gif.Image.ColorMap : gif.SColorMap;
+    std::vector<uint8_t> line(static_cast<size_t>(gif.Image.Width)), rgb;
+    for (int y = 0; map != nullptr && y < gif.Image.Height; ++y) {
+        if (DGifGetLine(&gif, line.data(), gif.Image.Width) != GIF_OK) return false;
+        if (!reducer.wants(static_cast<uint32_t>(y))) continue;
+        rgb.clear();
+        for (const uint8_t index : line) {
+            const GifColorType &colour = map->Colors[index];
+            rgb.insert(rgb.end(), {colour.Red, colour.Green, colour.Blue});
+        }
+        reducer.add_row(static_cast<uint32_t>(y), rgb.data());
+    }
+    return map != nullptr;
 }
 
-bool decode(const std::vector<uint8_t> &file, Target target, bool all_frames, uint8_t *output) {
+template <class Run>
+bool decode(const std::vector<uint8_t> &file, Run run) {
     Unread unread{file.data(), file.size()};
     int error = 0;
     GifFileType *const gif = DGifOpen(&unread, on_read, &error);
     if (gif == nullptr) return false;
-    const bool decoded =
-        target == Target::rgba ? run<uint32_t>(*gif, all_frames, output) : run<uint16_t>(*gif, all_frames, output);
+    const bool decoded = run(*gif);
     DGifCloseFile(gif, &error);
     return decoded;
 }
 
-} // namespace
-
-bool giflib_decode(const std::vector<uint8_t> &gif, Target target, uint8_t *output) {
-    return decode(gif, target, false, output);
+uint32_t *pixels_at(uint8_t *output) {
+    return reinterpret_cast<uint32_t *>(output);
 }
 
-bool giflib_decode_frames(const std::vector<uint8_t> &gif, Target target, uint8_t *output) {
-    return decode(gif, target, true, output);
+} // namespace
+
+bool giflib_decode(const std::vector<uint8_t> &file, uint8_t *output) {
+    return decode(file, [&](GifFileType &gif) {
+        return reach_first(gif) && paint_frame(gif, NO_TRANSPARENT_COLOR, pixels_at(output));
+    });
+}
+
+bool giflib_decode_frames(const std::vector<uint8_t> &file, uint8_t *output) {
+    return decode(file, [&](GifFileType &gif) { return run_all(gif, pixels_at(output)); });
+}
+
+bool giflib_reduce(const std::vector<uint8_t> &file, Box box, uint8_t *output) {
+    return decode(file, [&](GifFileType &gif) {
+        return reach_first(gif) && DGifGetImageDesc(&gif) == GIF_OK && run_reduced(gif, box, output);
+    });
 }
 
 } // namespace bench

@@ -5,7 +5,9 @@
 #include "bench/gif_bench.h"
 #include "bench/png_bench.h"
 #include "bench/png_rows_bench.h"
-#include "bench/ratio_reporter.h"
+#include "bench/reduced_bench.h"
+#include "bench/reporter.h"
+#include "bench/stream_bench.h"
 #include "bench/wbmp_bench.h"
 
 int main(int count, char **arguments) {
@@ -14,9 +16,12 @@ int main(int count, char **arguments) {
     bench::add_gif_benchmarks();
     bench::add_bmp_benchmarks();
     bench::add_wbmp_benchmarks();
+    bench::add_reduced_benchmarks();
+    bench::add_stream_benchmarks();
     benchmark::Initialize(&count, arguments);
     if (benchmark::ReportUnrecognizedArguments(count, arguments)) return 1;
-    bench::RatioReporter reporter;
+    bench::Reporter reporter;
     benchmark::RunSpecifiedBenchmarks(&reporter);
+    bench::print_ratio_table(reporter.best());
     return reporter.has_failures() ? 1 : 0;
 }

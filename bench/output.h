@@ -1,6 +1,7 @@
 // What the benchmarks decode to: a box, and pixels of a format.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <vector>
@@ -20,14 +21,17 @@ struct Format {
 };
 
 inline constexpr Format rgba = {"rgba", PELM_FORMAT_RGBA8888, 4};
-inline constexpr Format rgb = {"rgb", PELM_FORMAT_RGB888, 3};
 inline constexpr Format rgb565 = {"rgb565", PELM_FORMAT_RGB565, 2};
 
+inline size_t bytes_of(const Format &format, Box box) {
+    return static_cast<size_t>(box.width) * static_cast<size_t>(box.height) * format.pixel_bytes;
+}
+
 // One buffer for all, so that none finds it cold.
-inline std::vector<uint8_t> &output_for(const Format &format, Box box) {
+inline uint8_t *output_of(size_t size) {
     static std::vector<uint8_t> output;
-    output.resize(static_cast<size_t>(box.width) * static_cast<size_t>(box.height) * format.pixel_bytes);
-    return output;
+    output.resize(std::max(output.size(), size));
+    return output.data();
 }
 
 } // namespace bench

@@ -1,25 +1,18 @@
-// Large PNGs made at start, so that the benchmark needs no files: pictures of the kinds that compress differently, in
-// the ways that PNG stores them, written by libpng with its default settings.
+// PNGs made at start, so that the benchmark needs no files, written by libpng with its default settings.
 #pragma once
 
 #include <cstdint>
 #include <vector>
 
+#include "bench/motifs.h"
+#include "bench/png_writer.h"
+
 namespace bench {
 
-enum class Motif {
-    photo,        // gradients and shapes under sensor noise
-    screenshot,   // flat areas, frames and lines of text
-    illustration, // smooth shapes with soft edges; transparent around them where there is alpha
-    text          // a page of letters
-};
+// Palettes of 256 colours are dithered where the motif is a photo. Empty when libpng cannot write it.
+std::vector<uint8_t> png_picture(Motif motif, PngLayout layout, uint32_t width, uint32_t height);
 
-enum class Stored { rgb, rgba, grey, palette, rgb16, grey1 };
-
-// The pixels of row `y` as red, green and blue.
-std::vector<uint8_t> rgb_row(Motif motif, uint32_t y, uint32_t first_x, uint32_t width);
-
-// Empty when libpng cannot write it.
-std::vector<uint8_t> png_picture(Motif motif, Stored stored, uint32_t width, uint32_t height);
+// 32 x 32 pixels: every colour type and depth, interlaced and not, of different contents.
+std::vector<std::vector<uint8_t>> png_icons();
 
 } // namespace bench

@@ -8,12 +8,16 @@
 namespace bench {
 
 struct PngLayout {
-    int colour_type;
+    int colour_type; // as PNG counts them
     int depth;
+    bool interlaced = false;
+
+    bool has_colour() const { return (colour_type & 2) != 0; }
+    bool has_alpha() const { return (colour_type & 4) != 0; }
 };
 
-// `fill_row` appends the bytes of row y to an empty row. Palettes are of 3, 3 and 2 bits of red, green and blue. Empty
-// when libpng fails.
+// `fill_row` appends the bytes of row y to an empty row. Palettes hold the colours of bench/dither.h. Empty when libpng
+// fails.
 std::vector<uint8_t> write_png(uint32_t width, uint32_t height, PngLayout layout,
                                const std::function<void(uint32_t y, std::vector<uint8_t> &row)> &fill_row);
 

@@ -1,4 +1,4 @@
-#include "bench/stb_peer.h"
+#include "bench/peers.h"
 
 #if defined(__GNUC__)
 #pragma GCC diagnostic push
@@ -18,7 +18,7 @@
 
 namespace bench {
 
-bool stb_decode_rgba(const std::vector<uint8_t> &file) {
+bool stb_decode(const std::vector<uint8_t> &file) {
     int width = 0;
     int height = 0;
     int channels = 0;

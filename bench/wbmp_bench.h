@@ -1,4 +1,4 @@
-// WBMP: 12 megapixels pixel for pixel, against memcpy of the output, and reduced.
+// WBMP, whole and reduced, against memcpy of the output.
 #pragma once
 
 namespace bench {

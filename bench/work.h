@@ -1,16 +1,17 @@
-// What a benchmark decodes: files made or read when they are wanted first, and the folder of pictures by others.
+// What a benchmark decodes: files that are made when they are wanted first.
 #pragma once
 
 #include <cstdint>
-#include <filesystem>
 #include <functional>
+#include <memory>
+#include <utility>
 #include <vector>
 
 namespace bench {
 
 using Bytes = std::vector<uint8_t>;
 
-// Files that one iteration decodes, made or read when the first benchmark wants them, and kept.
+// Files that one iteration decodes, kept for all who decode them.
 class Work {
 public:
     explicit Work(std::function<std::vector<Bytes>()> make) : make_(std::move(make)) {}
@@ -24,11 +25,16 @@ private:
     std::vector<Bytes> files_;
 };
 
-std::filesystem::path image_folder(); // PELM_TEST_IMAGES, or the one beside the repository
+using SharedWork = std::shared_ptr<Work>;
 
-Bytes read_file(const std::filesystem::path &path);
-
-// Sorted, so that runs are alike. None where there is no such folder.
-std::vector<std::filesystem::path> files_with_suffix(const std::filesystem::path &folder, const char *suffix);
+// One file; none when `make` returns an empty one.
+template <class Make>
+SharedWork file_made_by(Make make) {
+    return std::make_shared<Work>([make]() -> std::vector<Bytes> {
+        Bytes file = make();
+        if (file.empty()) return {};
+        return {std::move(file)};
+    });
+}
 
 } // namespace bench

@@ -1,11 +1,9 @@
-#include "bench/ratio_reporter.h"
+#include "bench/reporter.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <iterator>
 
 namespace bench {
-
 namespace {
 
 using Run = benchmark::BenchmarkReporter::Run;
@@ -21,7 +19,7 @@ std::vector<Run> worth_a_line(const std::vector<Run> &runs) {
 
 } // namespace
 
-void RatioReporter::ReportRuns(const std::vector<Run> &runs) {
+void Reporter::ReportRuns(const std::vector<Run> &runs) {
     for (const Run &run : runs) {
         has_failures_ = has_failures_ || run.error_occurred;
         if (run.run_type != Run::RT_Iteration || run.error_occurred) continue;
@@ -32,19 +30,6 @@ void RatioReporter::ReportRuns(const std::vector<Run> &runs) {
         if (!is_new) best->second = std::min(best->second, time);
     }
     ConsoleReporter::ReportRuns(worth_a_line(runs));
-}
-
-void RatioReporter::Finalize() {
-    std::printf("\n%-40s %12s   speed against\n", "best of all repetitions", "pelm");
-    for (const auto &[work, times] : best_) {
-        const auto own = times.find("pelm");
-        if (own == times.end()) continue;
-        std::printf("%-40s %10.3f ms", work.c_str(), own->second);
-        for (const auto &[who, time] : times)
-            if (who != "pelm") std::printf("   %s %.2fx", who.c_str(), time / own->second);
-        std::printf("\n");
-    }
-    ConsoleReporter::Finalize();
 }
 
 } // namespace bench
