@@ -107,7 +107,7 @@ int32_t decode_rows_from(const BmpState &state, intptr_t cursor, int32_t rows, c
             result = pass_over_rows(state, band, reader);
         else if (state.oneToOne != 0)
             result = copy_rows(state, band, reader, to, load);
-        else
+        else if constexpr (requires { typename Load::Sum; }) // finished pixels cannot be added
             result = reduce_rows(state, band, reader, to, load);
     }
     close_rows(reader);

@@ -6,6 +6,7 @@
 
 #include <cstddef>
 
+#include "bmp/masked_lanes.h"
 #include "frame/bytes.h"
 #include "frame/packed.h"
 #include "frame/pixel.h"
@@ -101,6 +102,10 @@ struct MaskedRow {
                 (pixel & blue_mask) << blue_shift};
     }
     uint32_t sample(int32_t x) const { return Sum::of(channels_of((*this)(x))); }
+
+    template <class Store>
+    requires(Store::size != 3) int32_t write_some(int32_t from, int32_t count, uint8_t *out)
+    const { return write_masked_lanes<Store>(*this, row + 2 * ptrdiff_t{from}, count, out); }
 };
 
 struct Bgr24Row {

@@ -2,7 +2,7 @@
 //
 // A `Load` is a source row: load(x) gives the pixel in column x, in any type that frame/pixel.h's questions have
 // answers for. Where that is nothing but bytes of the row, `channels` says which, and `row` is where they are. Where it
-// has a faster way than pixel by pixel, write_some<size>(from, count, out) writes as many pixels as that serves, one
+// has a faster way than pixel by pixel, write_some<Store>(from, count, out) writes as many pixels as that serves, one
 // behind the other, and returns how many. A store is one of frame/stores.h; `put_wide`, where there is one, also writes
 // up to three bytes behind the pixel.
 #pragma once
@@ -60,8 +60,8 @@ template <class Store, class Load>
 inline void write_dense_run(const Load &load, int32_t from, int32_t count, uint8_t *out) {
     if constexpr (IsSwizzle<Store, Load>)
         if (can_swizzle()) return write_run_in_groups<Store>(load, from, count, out);
-    if constexpr (requires { load.template write_some<Store::size>(from, count, out); }) {
-        const int32_t done = load.template write_some<Store::size>(from, count, out);
+    if constexpr (requires { load.template write_some<Store>(from, count, out); }) {
+        const int32_t done = load.template write_some<Store>(from, count, out);
         from += done;
         count -= done;
         out += ptrdiff_t{done} * Store::size;
