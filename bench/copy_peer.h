@@ -9,11 +9,12 @@
 
 namespace bench {
 
-inline Contestant copy_of_output(const Format &format, Box box) {
+inline Contestant copy_of_output(const Format &format, Box box, uint32_t frames = 1) {
     const size_t size = bytes_of(format, box);
-    return {"memcpy", [size, pixels = std::make_shared<Bytes>()](const Bytes &) {
+    return {"memcpy", [=, pixels = std::make_shared<Bytes>()](const Bytes &) {
                 pixels->resize(size, 1);
-                std::memcpy(output_of(size), pixels->data(), size);
+                for (uint32_t i = 0; i < frames; ++i)
+                    std::memcpy(output_of(size), pixels->data(), size);
                 return true;
             }};
 }

@@ -1,6 +1,7 @@
 #include "bench/gif_bench.h"
 
 #include "bench/contest.h"
+#include "bench/copy_peer.h"
 #include "bench/gif_pictures.h"
 #include "bench/large_works.h"
 #include "bench/own_decoder.h"
@@ -43,9 +44,11 @@ bool equals_giflib(const Bytes &gif, const Kind &kind) {
            expected == got;
 }
 
-void add(const std::string &name, const Kind &kind, const SharedWork &work) {
-    add_contest("gif/" + name + "/rgba", work, {pelm_into(rgba, kind), giflib(kind), {"stb", kind.with_stb}},
-                [=](const Bytes &gif) { return equals_giflib(gif, kind); });
+void add(const std::string &name, const Kind &kind, const SharedWork &work,
+         const std::vector<Contestant> &others = {}) {
+    std::vector<Contestant> contestants = {pelm_into(rgba, kind), giflib(kind), {"stb", kind.with_stb}};
+    contestants.insert(contestants.end(), others.begin(), others.end());
+    add_contest("gif/" + name + "/rgba", work, contestants, [=](const Bytes &gif) { return equals_giflib(gif, kind); });
     add_contest("gif/" + name + "/rgb565", work, {pelm_into(rgb565, kind)});
 }
 
@@ -58,7 +61,8 @@ void add_gif_benchmarks() {
     add("animation full frames", animation,
         file_made_by([] { return gif_of_full_frames(Motif::photo, 800, 600, 12); }));
     add("animation small changes", animation,
-        file_made_by([] { return gif_of_small_changes(Motif::screenshot, 1280, 800, 24); }));
+        file_made_by([] { return gif_of_small_changes(Motif::screenshot, 1280, 800, 24); }),
+        {copy_of_output(rgba, {1280, 800}, 24)});
 }
 
 } // namespace bench

@@ -80,11 +80,15 @@ void count_gif() {
     count_still("GIF screenshot", gif_picture(Motif::screenshot, Colours::nearest, width, height),
                 {ZOTARPELMI_DecodeGIF, rgba, size});
     count_still("GIF text", gif_picture(Motif::text, Colours::two, width, height), {ZOTARPELMI_DecodeGIF, rgba, size});
-    const auto play = [](const Bytes &bytes) {
-        return play_memory({ZOTARPELMI_DecodeAGIF, rgba, size}, bytes, output_of(bytes_of(rgba, size)));
+    const auto play_as = [](Format format) {
+        return [=](const Bytes &bytes) {
+            return play_memory({ZOTARPELMI_DecodeAGIF, format, size}, bytes, output_of(bytes_of(format, size)));
+        };
     };
-    count("GIF animation, full frames", gif_of_full_frames(Motif::photo, width, height, 3), play);
-    count("GIF animation, small changes", gif_of_small_changes(Motif::screenshot, width, height, 6), play);
+    const Bytes changes = gif_of_small_changes(Motif::screenshot, width, height, 6);
+    count("GIF animation, full frames", gif_of_full_frames(Motif::photo, width, height, 3), play_as(rgba));
+    count("GIF animation, small changes", changes, play_as(rgba));
+    count("GIF animation, small changes, RGB565", changes, play_as(rgb565));
 }
 
 void count_bmp() {

@@ -2,7 +2,6 @@
 #pragma once
 
 #include "frame/finished.h"
-#include "frame/packed.h"
 
 namespace pelm {
 
@@ -41,7 +40,7 @@ struct FinishedRow {
         if constexpr (depth <= 2)
             return write_groups<Store::size>(bytes, count, out);
         else if constexpr (Store::size == 4 || Store::size == 2)
-            return write_eight_bytes_each<Store::size>(bytes, count, out);
+            return write_looked_up<depth, Store::size>(colours->pixels, bytes, count, out);
         else
             return 0;
     }
@@ -60,21 +59,6 @@ private:
             std::memcpy(out + 2 * half * i + half, groups[bytes[i] & 15], 16);
         }
         return whole * in_byte;
-    }
-
-    // Two or four pixels with each store.
-    template <int32_t size>
-    int32_t write_eight_bytes_each(const uint8_t *bytes, int32_t count, uint8_t *out) const {
-        constexpr int32_t at_once = 8 / size;
-        const int32_t groups = count / at_once;
-        const uint32_t *const table = colours->pixels;
-        for (ptrdiff_t i = 0; i < groups; ++i, bytes += at_once * depth / 8) {
-            uint64_t pixels = 0;
-            for (int32_t j = 0; j < at_once; ++j)
-                pixels |= uint64_t{table[packed_sample<depth>(bytes, j)]} << (8 * size * j);
-            std::memcpy(out + 8 * i, &pixels, 8);
-        }
-        return groups * at_once;
     }
 };
 

@@ -6,6 +6,7 @@
 #include <cstring>
 
 #include "frame/finished.h"
+#include "gif/packed_lanes.h"
 #include "gif/state.h"
 
 namespace pelm {
@@ -100,6 +101,10 @@ struct IndexedRow {
     const uint32_t *finished;
 
     Pixel operator()(int32_t x) const { return {finished[row[x]]}; }
+
+    template <class Store>
+    requires(Store::size == 2) int32_t write_some(int32_t from, int32_t count, uint8_t *out)
+    const { return write_looked_up<8, Store::size>(finished, row + from, count, out); }
 };
 
 // Packed colours.
@@ -109,6 +114,10 @@ struct PackedRow {
     const uint32_t *row;
 
     Pixel operator()(int32_t x) const { return {row[x]}; }
+
+    template <class Store>
+    requires std::is_same_v<Store, StoreRgb565> int32_t write_some(int32_t from, int32_t count, uint8_t *out)
+    const { return write_rgb565_lanes(row + from, count, out); }
 };
 
 // The active table as finished pixels, 256 of them; made when the image's first row needs it.
