@@ -78,6 +78,22 @@ TEST_F(BmpBoxes, giant_boxes_without_an_output_do_no_harm) {
                         }
 }
 
+TEST_F(BmpBoxes, a_buffer_whose_rows_are_too_long_to_step_over_is_refused) {
+    for (const uint32_t format : {0u, 1u, 5u, 6u, 7u, 8u})
+        for (int turns = 0; turns < 4; ++turns) {
+            host.reset();
+            const int32_t row_pixels = INT32_MAX / (format == 0 ? 2 : format == 1 || format == 6 ? 3 : 4) + 1;
+            const BmpRequest request{format, turns, 0, row_pixels, 5};
+            const Bytes file = file_bytes(noise_bmp(rgb24, 7, 5, false));
+            TestSource source(PELM_SOURCE_MEMORY, file, 64);
+            ImageDecodeInfo info = marked_info(&source.source, request);
+            uint8_t byte = background; // of a buffer that nothing may be written to
+            EXPECT_EQ(ZOTARPELMI_DecodeBMP(&info, &byte, row_pixels, 5), 0) << described(request);
+            EXPECT_EQ(byte, background);
+            EXPECT_TRUE(host.live_blocks().empty()) << described(request);
+        }
+}
+
 TEST_F(BmpBoxes, stretching_to_a_giant_box_fails_for_want_of_memory) {
     for (const uint32_t kind : all_kinds)
         for (const int32_t box_width : {1 << 28, (1 << 29) - 1, 1 << 29, (1 << 29) + 1, 1 << 30, INT32_MAX})
