@@ -1,6 +1,7 @@
 // Files and streams that are read whole into private memory.
 #include <cerrno>
 
+#include <malloc.h>
 #include <sys/stat.h>
 
 #include "tests/host/scripted_stream.h"
@@ -186,6 +187,24 @@ TEST(HostSpool, wrong_arguments_are_refused) {
     EXPECT_EQ(PelmHost_OpenSpooled(&source, 5, stdin, 0), EINVAL);
     EXPECT_TRUE(is_zeroed(source));
     EXPECT_EQ(PelmHost_OpenSpooled(nullptr, PELM_SOURCE_MEMORY, stdin, 0), EINVAL);
+}
+
+TEST(HostSpool, what_was_read_before_a_failure_is_freed) {
+    // Blocks that are taken from the heap, and are too large for the thread's cache of freed blocks.
+    const auto fail = [&] {
+        Pipe pipe;
+        pipe.write_bytes(std::string(5000, 'x'));
+        pipe.close_writer();
+        FILE *const piped = fdopen(dup(pipe.reader()), "r");
+        InputSource source;
+        EXPECT_EQ(PelmHost_OpenSpooled(&source, PELM_SOURCE_MEMORY, piped, 4000), EFBIG);
+        fclose(piped);
+    };
+    fail();
+    const size_t before = mallinfo2().uordblks;
+    for (int32_t i = 0; i < 20; ++i)
+        fail();
+    EXPECT_LT(mallinfo2().uordblks, before + 10 * 4000);
 }
 
 } // namespace
