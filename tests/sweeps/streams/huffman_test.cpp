@@ -134,8 +134,6 @@ TEST_F(HuffmanSweep, every_code_of_few_code_lengths) {
 // Blocks of any codes: elements of theirs, then noise. Some of them begin where the window is about to wrap.
 class FullSize : public HuffmanSweep, public testing::WithParamInterface<uint32_t> {
 protected:
-    static constexpr uint32_t shards = 4;
-
     DynamicCodes any_codes() {
         DynamicCodes codes;
         codes.literal_lengths = any_lengths(random, random.one_in(2) ? 286 : random.between(257, 288));
