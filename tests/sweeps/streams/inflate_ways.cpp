@@ -6,7 +6,6 @@
 #include <stdexcept>
 
 #include "png/inflate/inflate.h"
-
 #include "tests/support/kernels.h"
 
 namespace pelm::sweeps {
