@@ -1,5 +1,6 @@
 // A plain main for a target: hands it the files that are named, or that lie in the folders that are named.
 // Nothing of the C++ library that is not in its headers: MemorySanitizer sees only what is compiled with it.
+#define _FILE_OFFSET_BITS 64 // or a 32-bit program cannot read the folders of a 64-bit system that emulates it
 #include <dirent.h>
 
 #include <algorithm>

@@ -71,6 +71,8 @@ private:
     Outcome outcome_;
     Account account_;
     RequestModel model_;
+    // What the scaled size is before a call; no constant, or a fuzzer makes an image of that size.
+    const int32_t unwritten_;
     Sides scaled_{};
     ExactBytes file_;
     PelmTestBytes bytes_;
@@ -85,6 +87,7 @@ private:
 
 Session::Session(const Plan &plan, int32_t filling, bool has_buffers, const Outcome *measured)
     : plan_(plan), has_buffers_(has_buffers), measured_(measured), account_(plan, filling), model_(plan),
+      unwritten_(static_cast<int32_t>(hash(untouched, plan.file.data(), plan.file.size()) >> 32)),
       file_(held_bytes(plan)), bytes_{file_.bytes(), static_cast<int32_t>(file_.size()), plan.stated_end ? 1 : 0} {
     if (file_.size() > 0) memcpy(file_.bytes(), plan.file.data(), file_.size());
     PelmTest_OpenSource(&source_, plan.kind, &bytes_, plan.buffer_size);
@@ -128,7 +131,7 @@ void Session::make(const Call &call, const Step &step) {
     if (model_.is_idle()) begun_ = {step.width, step.height};
     uint8_t *const output = output_for(call, step);
     info_.hasTransparency = untouched;
-    info_.outputWidth = info_.outputHeight = static_cast<int32_t>(untouched);
+    info_.outputWidth = info_.outputHeight = unwritten_;
     if (model_.state() == State::bmp_parked && call.progress == Progress::resumes && !step.null_request)
         bring_staging_buffer();
     account_.begin_call(model_.is_idle());
@@ -194,8 +197,7 @@ uint8_t *Session::output_for(const Call &call, const Step &step) {
 void Session::look_at(const Call &call, const Step &step, int32_t result) {
     const bool idle = info_.decoderState == nullptr;
     const Sides words{info_.outputWidth, info_.outputHeight};
-    constexpr auto unwritten = static_cast<int32_t>(untouched);
-    const bool told_the_size = words != Sides{unwritten, unwritten};
+    const bool told_the_size = words != Sides{unwritten_, unwritten_};
     if (told_the_size) scaled_ = words;
     outcome_.scaled.push_back(scaled_);
     const Left left{result, !idle, told_the_size ? std::optional(words) : std::nullopt};

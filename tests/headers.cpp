@@ -1,0 +1,1 @@
+// Empty: what the precompiled headers of the test programs are compiled for.
