@@ -19,8 +19,10 @@ Kernels find_kernels() {
     unsigned eax, ebx, ecx, edx;
     const bool has_answer = __get_cpuid(1, &eax, &ebx, &ecx, &edx) != 0;
     const bool has_shuffles = has_answer && (ecx & bit_SSSE3) != 0 && (edx & bit_SSE2) != 0;
-    if (has_shuffles) return (ecx & bit_PCLMUL) != 0 ? Kernels::carryless : Kernels::shuffles;
-    return lanes_are_fast ? Kernels::lanes : Kernels::plain;
+    if (!has_shuffles) return lanes_are_fast ? Kernels::lanes : Kernels::plain;
+    if ((ecx & bit_PCLMUL) == 0) return Kernels::shuffles;
+    const bool has_bmi2 = __get_cpuid_count(7, 0, &eax, &ebx, &ecx, &edx) != 0 && (ebx & bit_BMI2) != 0;
+    return has_bmi2 ? Kernels::bmi2 : Kernels::carryless;
 #else
     return lanes_are_fast ? Kernels::shuffles : Kernels::plain;
 #endif

@@ -12,6 +12,7 @@ enum class Kernels : uint8_t {
     lanes,     // frame/lanes.h, where lanes_are_fast
     shuffles,  // and bytes put into any order: frame/swizzle.cpp
     carryless, // and x86's carry-less multiplication
+    bmi2,      // and x86's shifts by a number in any register
 };
 
 // What this processor is best served with. It is asked once: asking is slow in a virtual machine.

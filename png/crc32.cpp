@@ -49,7 +49,7 @@ constexpr size_t least_to_fold = 48; // bytes: fewer go faster through the table
 } // namespace
 
 uint32_t crc32_go_on(uint32_t crc, const uint8_t *bytes, size_t length) {
-    if (length >= least_to_fold && kernels() == Kernels::carryless) {
+    if (length >= least_to_fold && kernels() >= Kernels::carryless) {
         const size_t blocks = length / 16;
         crc = go_on_by_tables(0, crc32_fold(crc, bytes, blocks).bytes, 16);
         bytes += 16 * blocks;

@@ -1,5 +1,6 @@
 #include "png/inflate/fast_loop.h"
 
+#include "frame/processor.h"
 #include "png/inflate/wide_copy.h"
 
 namespace pelm {
@@ -42,11 +43,9 @@ inline BitReader reader_of(Bits bits, const uint8_t *&next) {
     return {static_cast<size_t>(bits.word & mask), bits.count};
 }
 
-} // namespace
-
 // The tables are copies, which no write to the window can be suspected of changing.
-bool run_fast(DecodingTable literals, DecodingTable distances, BitReader &reader, const uint8_t *&next,
-              const uint8_t *end, Window &window) {
+[[gnu::always_inline]] inline bool run(DecodingTable literals, DecodingTable distances, BitReader &reader,
+                                       const uint8_t *&next, const uint8_t *end, Window &window) {
     if (end - next < fast_input || is_full(window)) return false;
     Bits bits = {reader.bits, reader.count};
     const uint8_t *in = next;
@@ -103,6 +102,23 @@ bool run_fast(DecodingTable literals, DecodingTable distances, BitReader &reader
     next = in;
     produced(window, static_cast<uint32_t>(out - first));
     return ended;
+}
+
+#if defined(__x86_64__)
+[[gnu::target("bmi2")]] bool run_bmi2(DecodingTable literals, DecodingTable distances, BitReader &reader,
+                                      const uint8_t *&next, const uint8_t *end, Window &window) {
+    return run(literals, distances, reader, next, end, window);
+}
+#endif
+
+} // namespace
+
+bool run_fast(DecodingTable literals, DecodingTable distances, BitReader &reader, const uint8_t *&next,
+              const uint8_t *end, Window &window) {
+#if defined(__x86_64__)
+    if (kernels() >= Kernels::bmi2) return run_bmi2(literals, distances, reader, next, end, window);
+#endif
+    return run(literals, distances, reader, next, end, window);
 }
 
 } // namespace pelm
