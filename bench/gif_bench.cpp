@@ -56,8 +56,9 @@ void add(const std::string &name, const Kind &kind, const SharedWork &work,
 
 void add_gif_benchmarks() {
     add("photo dithered", still, gif_photo_hd());
-    add("screenshot", still, gif_screenshot_hd());
-    add("text two colours", still, file_made_by([] { return gif_picture(Motif::text, Colours::two, 2400, 3400); }));
+    add("screenshot", still, gif_screenshot_hd(), {copy_of_output(rgba, {1920, 1080})});
+    add("text two colours", still, file_made_by([] { return gif_picture(Motif::text, Colours::two, 2400, 3400); }),
+        {copy_of_output(rgba, {2400, 3400})});
     add("animation full frames", animation,
         file_made_by([] { return gif_of_full_frames(Motif::photo, 800, 600, 12); }));
     add("animation small changes", animation,

@@ -80,8 +80,21 @@ Pixel illustration_at(uint32_t x, uint32_t y) {
     return colour;
 }
 
+// At 300 dots per inch: a centimetre of margin, paragraphs of five lines of twelve-point letters, the last one short.
+bool print_at(uint32_t x, uint32_t y) {
+    constexpr uint32_t margin = 120, scale = 5, line_height = 12 * scale, line_width = 72 * 6 * scale;
+    if (x < margin || y < margin) return false;
+    const uint32_t line = (y - margin) / line_height, in_paragraph = line % 6;
+    const uint32_t width = in_paragraph == 5 ? 0 : in_paragraph == 4 ? line_width * (line % 7 + 2) / 10 : line_width;
+    return x - margin < width && letter_at(x - margin, y - margin, scale);
+}
+
+// Edges are soft, as those of print are.
 Pixel text_at(uint32_t x, uint32_t y) {
-    return letter_at(x, y, 2) ? Pixel{0, 0, 0, 255} : Pixel{255, 255, 255, 255};
+    const int dots =
+        int{print_at(x, y)} + int{print_at(x + 1, y)} + int{print_at(x, y + 1)} + int{print_at(x + 1, y + 1)};
+    const int light = 255 - dots * 255 / 4;
+    return {light, light, light, 255};
 }
 
 } // namespace

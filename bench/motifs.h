@@ -9,7 +9,7 @@ enum class Motif {
     photo,        // gradients and shapes under sensor noise
     screenshot,   // flat areas, frames and lines of text
     illustration, // smooth shapes with soft edges; transparent around them where there is alpha
-    text          // a page of letters
+    text          // a printed page
 };
 
 struct Pixel {

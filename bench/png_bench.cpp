@@ -1,6 +1,7 @@
 #include "bench/png_bench.h"
 
 #include "bench/contest.h"
+#include "bench/copy_peer.h"
 #include "bench/large_works.h"
 #include "bench/own_decoder.h"
 #include "bench/peers.h"
@@ -42,15 +43,19 @@ bool equals_libpng(const Bytes &png) {
            expected == got;
 }
 
-void add(const std::string &name, const SharedWork &work) {
-    add_contest("png/" + name + "/rgba", work,
-                {pelm_into(rgba), whole("libpng", libpng_decode), whole("libspng", spng_decode), {"stb", stb_decode}},
-                equals_libpng);
+void add(const std::string &name, const SharedWork &work, const std::vector<Contestant> &others = {}) {
+    std::vector<Contestant> contestants = {
+        pelm_into(rgba), whole("libpng", libpng_decode), whole("libspng", spng_decode), {"stb", stb_decode}};
+    contestants.insert(contestants.end(), others.begin(), others.end());
+    add_contest("png/" + name + "/rgba", work, contestants, equals_libpng);
     add_contest("png/" + name + "/rgb565", work, {pelm_into(rgb565)});
 }
 
-void add_picture(const std::string &name, Motif motif, PngLayout layout, uint32_t width, uint32_t height) {
-    add(name, file_made_by([=] { return png_picture(motif, layout, width, height); }));
+void add_picture(const std::string &name, Motif motif, PngLayout layout, int32_t width, int32_t height) {
+    const auto picture = [=] {
+        return png_picture(motif, layout, static_cast<uint32_t>(width), static_cast<uint32_t>(height));
+    };
+    add(name, file_made_by(picture), {copy_of_output(rgba, {width, height})});
 }
 
 } // namespace
