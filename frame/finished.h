@@ -5,6 +5,8 @@
 #include <cstring>
 
 #include "frame/packed.h"
+#include "frame/row_hints.h"
+#include "frame/sixteen_colours.h"
 #include "frame/write_row.h"
 
 namespace pelm {
@@ -22,17 +24,52 @@ struct StoreFinished {
     static void put_wide(uint8_t *at, FinishedPixel pixel) { std::memcpy(at, &pixel.word, sizeof pixel.word); }
 };
 
-// Samples of `depth` bits as pixels of two or four bytes, eight bytes with each store. Returns how many it wrote.
+// As many samples of `depth` bits as make eight bytes of pixels, each of two or four bytes.
+template <int32_t depth, int32_t size>
+inline uint64_t eight_bytes_looked_up(const uint32_t *colours, const uint8_t *samples) {
+    uint64_t pixels = 0;
+    for (int32_t j = 0; j < 8 / size; ++j)
+        pixels |= uint64_t{colours[packed_sample<depth>(samples, j)]} << (8 * size * j);
+    return pixels;
+}
+
+// The same into the output: small pixels in one piece.
+template <int32_t depth, int32_t size>
+inline void put_eight_bytes_looked_up(const uint32_t *colours, const uint8_t *samples, uint8_t *out) {
+    if constexpr (size == 4) {
+        for (int32_t j = 0; j < 2; ++j)
+            std::memcpy(out + 4 * j, &colours[packed_sample<depth>(samples, j)], 4);
+    } else {
+        const uint64_t pixels = eight_bytes_looked_up<depth, size>(colours, samples);
+        std::memcpy(out, &pixels, 8);
+    }
+}
+
+// Samples of `depth` bits as pixels of two or four bytes. Returns how many it wrote.
 template <int32_t depth, int32_t size>
 inline int32_t write_looked_up(const uint32_t *colours, const uint8_t *samples, int32_t count, uint8_t *out) {
-    constexpr int32_t at_once = 8 / size;
+    constexpr int32_t at_once = 8 / size, group_bytes = at_once * depth / 8;
+    constexpr int32_t groups_in_eight = 8 / group_bytes;
     const int32_t groups = count / at_once;
-    for (ptrdiff_t i = 0; i < groups; ++i, samples += at_once * depth / 8) {
-        uint64_t pixels = 0;
-        for (int32_t j = 0; j < at_once; ++j)
-            pixels |= uint64_t{colours[packed_sample<depth>(samples, j)]} << (8 * size * j);
-        std::memcpy(out + 8 * i, &pixels, 8);
+    ptrdiff_t i = 0;
+    const RowHints hints = hints_of_row(samples, int64_t{groups} * group_bytes);
+    if (depth == 8 && hints.is_all_small) i = write_sixteen_colours(colours, size, samples, count, out) / at_once;
+    if (hints.has_runs) {
+        for (; i <= groups - groups_in_eight; i += groups_in_eight) {
+            const uint8_t *const eight = samples + i * group_bytes;
+            if (are_eight_alike(eight)) {
+                const uint64_t pixels = eight_bytes_looked_up<depth, size>(colours, eight);
+                for (int32_t k = 0; k < groups_in_eight; ++k)
+                    std::memcpy(out + 8 * (i + k), &pixels, 8);
+            } else {
+                for (int32_t k = 0; k < groups_in_eight; ++k)
+                    put_eight_bytes_looked_up<depth, size>(colours, eight + k * group_bytes, out + 8 * (i + k));
+            }
+        }
     }
+#pragma GCC unroll 4
+    for (; i < groups; ++i)
+        put_eight_bytes_looked_up<depth, size>(colours, samples + i * group_bytes, out + 8 * i);
     return groups * at_once;
 }
 

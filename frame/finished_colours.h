@@ -54,10 +54,20 @@ private:
         constexpr int32_t room = (half + 16 + size - 1) / size; // pixels that the two groups of a byte reach over
         const int32_t whole = count < room ? 0 : (count - room) / in_byte + 1;
         const uint8_t(*const groups)[16] = colours->groups; // the output might be where the pointer to it lies
-        for (ptrdiff_t i = 0; i < whole; ++i) {
-            std::memcpy(out + 2 * half * i, groups[bytes[i] >> 4], 16);
-            std::memcpy(out + 2 * half * i + half, groups[bytes[i] & 15], 16);
+        const auto write_byte = [&](ptrdiff_t at, uint32_t byte) {
+            std::memcpy(out + 2 * half * at, groups[byte >> 4], 16);
+            std::memcpy(out + 2 * half * at + half, groups[byte & 15], 16);
+        };
+        ptrdiff_t i = 0;
+        if (hints_of_row(bytes, whole).has_runs) {
+            for (; i <= whole - 8; i += 8) {
+                const bool are_alike = are_eight_alike(bytes + i);
+                for (ptrdiff_t k = 0; k < 8; ++k)
+                    write_byte(i + k, bytes[are_alike ? i : i + k]);
+            }
         }
+        for (; i < whole; ++i)
+            write_byte(i, bytes[i]);
         return whole * in_byte;
     }
 };

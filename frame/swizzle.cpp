@@ -2,15 +2,8 @@
 
 #include <cstring>
 
-#include "frame/lanes.h"
 #include "frame/processor.h"
-
-#if defined(__x86_64__) || defined(__i386__)
-#include <tmmintrin.h>
-#define PELM_SHUFFLES __attribute__((target("ssse3")))
-#elif defined(__ARM_NEON)
-#define PELM_SHUFFLES
-#endif
+#include "frame/shuffles.h"
 
 namespace pelm {
 
@@ -19,20 +12,6 @@ namespace pelm {
 namespace {
 
 #if defined(__x86_64__) || defined(__i386__)
-
-using Group = __m128i; // four pixels as words
-
-PELM_SHUFFLES inline Group load(const uint8_t *from) {
-    return _mm_loadu_si128(reinterpret_cast<const __m128i *>(from));
-}
-
-PELM_SHUFFLES inline void store(uint8_t *to, Group group) {
-    _mm_storeu_si128(reinterpret_cast<__m128i *>(to), group);
-}
-
-PELM_SHUFFLES inline Group shuffle(Group group, Group places) {
-    return _mm_shuffle_epi8(group, places);
-}
 
 PELM_SHUFFLES inline Group join_halves(Group a, Group b) {
     return _mm_unpacklo_epi64(a, b);
@@ -65,25 +44,6 @@ PELM_SHUFFLES inline void store_half(uint8_t *to, Group group) {
 
 #else
 
-using Group = uint8x16_t;
-
-inline Group load(const uint8_t *from) {
-    return vld1q_u8(from);
-}
-
-inline void store(uint8_t *to, Group group) {
-    vst1q_u8(to, group);
-}
-
-inline Group shuffle(Group group, Group places) {
-#if defined(__aarch64__)
-    return vqtbl1q_u8(group, places);
-#else
-    const uint8x8x2_t table = {{vget_low_u8(group), vget_high_u8(group)}};
-    return vcombine_u8(vtbl2_u8(table, vget_low_u8(places)), vtbl2_u8(table, vget_high_u8(places)));
-#endif
-}
-
 inline Group join_halves(Group a, Group b) {
     return vcombine_u8(vget_low_u8(a), vget_low_u8(b));
 }
@@ -100,7 +60,7 @@ inline bool are_opaque(Group words) {
 
 inline Group triples_of(Group words) {
     static constexpr uint8_t places[16] = {0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, 0x80, 0x80, 0x80, 0x80};
-    return shuffle(words, load(places));
+    return shuffle(words, load_group(places));
 }
 
 inline Group pack_rgb565(Group words) {
@@ -121,15 +81,15 @@ inline void store_half(uint8_t *to, Group group) {
 // Four pixels of `size` bytes. Reads 16 bytes, or for the wider ones 2 x `size` and 16 more.
 template <int32_t size>
 PELM_SHUFFLES inline Group load_words(const uint8_t *from, Group places) {
-    const Group first = shuffle(load(from), places);
+    const Group first = shuffle(load_group(from), places);
     if constexpr (size <= 4) return first;
-    return join_halves(first, shuffle(load(from + 2 * size), places));
+    return join_halves(first, shuffle(load_group(from + 2 * size), places));
 }
 
 // The pixels behind these may be blended with what lies there: nothing of it is written.
 PELM_SHUFFLES inline void store_12(uint8_t *to, Group group) {
     uint8_t bytes[16];
-    store(bytes, group);
+    store_group(bytes, group);
     std::memcpy(to, bytes, 12);
 }
 
@@ -142,25 +102,26 @@ PELM_SHUFFLES int32_t swizzle_as(const Swizzle &how, const uint8_t *row, int32_t
     constexpr int32_t reach = (bytes_read + size - 1) / size > (bytes_written + target_size - 1) / target_size
                                   ? (bytes_read + size - 1) / size
                                   : (bytes_written + target_size - 1) / target_size;
-    const Group places = load(how.places);
-    const Group ones = load(how.ones);
+    const Group places = load_group(how.places);
+    const Group ones = load_group(how.ones);
     int32_t done = 0;
     if constexpr (to == SwizzleTo::rgb565 && !stops_at_alpha) {
         for (; done <= count - reach - 4; done += 8) {
             const Group first = pack_rgb565(load_words<size>(row, places));
             const Group last = pack_rgb565(load_words<size>(row + 4 * size, places));
-            store(out, join_halves(first, last));
+            store_group(out, join_halves(first, last));
             row += 8 * size;
             out += 8 * target_size;
         }
     }
+#pragma GCC unroll 4
     for (; done <= count - reach; done += 4) {
         const Group words = set_bits(load_words<size>(row, places), ones);
         if (stops_at_alpha && !are_opaque(words)) break;
         if constexpr (to == SwizzleTo::words)
-            store(out, words);
+            store_group(out, words);
         else if constexpr (to == SwizzleTo::triples)
-            stops_at_alpha ? store_12(out, triples_of(words)) : store(out, triples_of(words));
+            stops_at_alpha ? store_12(out, triples_of(words)) : store_group(out, triples_of(words));
         else
             store_half(out, pack_rgb565(words));
         row += 4 * size;

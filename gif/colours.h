@@ -103,7 +103,7 @@ struct IndexedRow {
     Pixel operator()(int32_t x) const { return {finished[row[x]]}; }
 
     template <class Store>
-    requires(Store::size == 2) int32_t write_some(int32_t from, int32_t count, uint8_t *out)
+    requires(Store::size == 2 || Store::size == 4) int32_t write_some(int32_t from, int32_t count, uint8_t *out)
     const { return write_looked_up<8, Store::size>(finished, row + from, count, out); }
 };
 

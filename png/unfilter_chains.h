@@ -13,9 +13,10 @@ namespace pelm {
 struct AverageChain {
     Bytes16 left = ~Bytes16{};
 
-    Bytes16 next(Bytes16 residual, Bytes16 up) {
-        left = mean_rounded_up(left, ~up) - residual;
-        return ~left;
+    Bytes16 next(Bytes16 residual, Bytes16 up) { return ~next_complement(residual, ~up); }
+
+    Bytes16 next_complement(Bytes16 residual, Bytes16 up_complement) {
+        return left = mean_rounded_up(left, up_complement) - residual;
     }
 };
 

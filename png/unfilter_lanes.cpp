@@ -102,14 +102,14 @@ inline uint32_t undo_average_of_small_pixels(uint8_t *row, const uint8_t *above,
     uint32_t i = 0;
     for (; length - i >= 8; i += 8) {
         auto residuals = std::bit_cast<Words2>(load_bytes<8>(row + i));
-        auto up = std::bit_cast<Words2>(load_bytes<8>(above + i));
-        Bytes16 pixels[count];
+        auto up = std::bit_cast<Words2>(~load_bytes<8>(above + i));
+        Bytes16 complements[count];
         for (uint32_t k = 0; k < count; ++k) {
-            pixels[k] = chain.next(std::bit_cast<Bytes16>(residuals), std::bit_cast<Bytes16>(up));
+            complements[k] = chain.next_complement(std::bit_cast<Bytes16>(residuals), std::bit_cast<Bytes16>(up));
             residuals >>= 8 * unit;
             up >>= 8 * unit;
         }
-        store_bytes<8>(row + i, join_first<unit>(pixels));
+        store_bytes<8>(row + i, ~join_first<unit>(complements));
     }
     return i;
 }
