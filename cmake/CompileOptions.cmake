@@ -7,6 +7,17 @@ function(pelm_compile_options target)
   endif()
 endfunction()
 
+# The libraries' own code is compiled so that each line keeps its counter, and so are the tests that compile templates of
+# it. To count the others would only take time.
+function(pelm_count_execution target)
+  if(PELM_COVERAGE)
+    target_compile_options(${target} PRIVATE --coverage -Og -fno-early-inlining ${ARGN})
+  endif()
+endfunction()
+if(PELM_COVERAGE)
+  add_link_options(--coverage)
+endif()
+
 if(PELM_SANITIZE)
   add_compile_options(-fsanitize=${PELM_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
   add_link_options(-fsanitize=${PELM_SANITIZE})
