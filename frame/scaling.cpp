@@ -16,9 +16,8 @@ Scaling scale_to_fit(Size image, Size box) {
     // The side that follows when the other one takes the box's.
     const int64_t width_for_box_height = static_cast<int64_t>(image.width) * box.height / image.height;
     const int64_t height_for_box_width = static_cast<int64_t>(image.height) * box.width / image.width;
-    const bool fills_the_box = (height_for_box_width == box.height || width_for_box_height == box.width) &&
-                               box.width <= image.width && box.height <= image.height;
-    if (fills_the_box) return {box.width, box.height, false};
+    // Where either is the box's too, the box is no larger than the image, whichever sides it has.
+    if (height_for_box_width == box.height || width_for_box_height == box.width) return {box.width, box.height, false};
 
     Scaling scaling = {image.width, image.height, false};
     if (box.width < scaling.width) {
