@@ -21,25 +21,23 @@ int32_t end(ImageDecodeInfo &info, GifDecoderState *state, int32_t result) {
     return result;
 }
 
-// Screen rows outside the frame, from the canvas. False when the order of rows has been lost.
-bool write_canvas_rows(GifDecoderState &state, int32_t from, int32_t behind) {
+// Screen rows outside the frame, from the canvas.
+void write_canvas_rows(GifDecoderState &state, int32_t from, int32_t behind) {
     for (int32_t row = from; row < behind && row < state.screenHeight; ++row) {
         state.sourceRow = row;
         state.canvasRow = state.canvas + static_cast<ptrdiff_t>(row) * state.screenWidth;
-        if (PELMI_WriteTheLine(&state, state.outputStart) == 0) return false;
+        PELMI_WriteTheLine(&state, state.outputStart);
     }
-    return true;
 }
 
-bool write_rows_above(GifDecoderState &state) {
-    if (!write_canvas_rows(state, 0, state.imageTop)) return false;
+void write_rows_above(GifDecoderState &state) {
+    write_canvas_rows(state, 0, state.imageTop);
     state.sourceRow = state.imageTop;
     state.canvasRow = state.rowBuffer;
-    return true;
 }
 
-bool write_rows_below(GifDecoderState &state) {
-    return write_canvas_rows(state, state.imageTop + state.imageHeight, state.screenHeight);
+void write_rows_below(GifDecoderState &state) {
+    write_canvas_rows(state, state.imageTop + state.imageHeight, state.screenHeight);
 }
 
 // What the walk to the next frame found decides what the call that delivered this one gives.
@@ -93,15 +91,15 @@ GifDecoderState *begin_slices(ImageDecodeInfo &info, Size box, void *out) {
 }
 
 int32_t decode_frame(ImageDecodeInfo &info, GifDecoderState *state) {
-    if (!write_rows_above(*state)) return end(info, state, PELM_RESULT_FAILED);
+    write_rows_above(*state);
     PELMI_DecodeGIFImage(state->input->source, state, state->outputStart); // what is there of it is the frame
     report_frame(info, *state);
-    if (!write_rows_below(*state)) return end(info, state, PELM_RESULT_FAILED);
+    write_rows_below(*state);
     return deliver(info, state, seek_frame(info, *state));
 }
 
 int32_t begin_frame_slices(ImageDecodeInfo &info, GifDecoderState *state) {
-    if (!write_rows_above(*state)) return end(info, state, PELM_RESULT_FAILED);
+    write_rows_above(*state);
     PELMI_DecodeGIFImageIter(state->input->source, state, state->outputStart, 1); // the next call tells how it ended
     state->framePhase = GIF_IN_FRAME;
     info.decoderState = state;
@@ -112,7 +110,7 @@ int32_t next_frame_slice(ImageDecodeInfo &info, GifDecoderState *state) {
     InputSource *const source = state->input->source;
     const int32_t result = PELMI_DecodeGIFImageIter(source, state, state->outputStart, 0);
     if (result == PELM_RESULT_MORE) return result;
-    if (!write_rows_below(*state)) return end(info, state, PELM_RESULT_FAILED);
+    write_rows_below(*state);
     state->framePhase = GIF_BETWEEN_FRAMES;
     const int32_t found = PELMI_SeekImageData(source, state);
     info.hasTransparency = state->hasTransparency;
