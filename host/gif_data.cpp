@@ -7,8 +7,7 @@ namespace pelm::host {
 namespace {
 
 constexpr uint32_t table_size = 4096;
-constexpr uint32_t widest_code = 12;      // bits
-constexpr uint32_t longest_string = 4096; // of what a sound file can make; longer ones are decoded as code 0
+constexpr uint32_t widest_code = 12; // bits
 
 class Codes {
 public:
@@ -85,9 +84,6 @@ public:
     uint32_t next() const { return next_; }
 
 private:
-    // Whatever is too long is decoded as code 0.
-    uint32_t length_of(uint32_t code) const { return lengths_[code] > longest_string ? 1 : lengths_[code]; }
-
     uint32_t roots_;
     uint32_t next_; // entry to be added; the table stays as it is once it is full
     uint32_t previous_ = 0;
@@ -97,8 +93,9 @@ private:
 uint32_t Strings::pixels_of(uint32_t code) {
     const bool is_known = code < next_;
     const uint32_t prefix = previous_ < next_ ? previous_ : 0;
-    const uint32_t pixels = is_known ? length_of(code) : length_of(prefix) + 1;
-    if (next_ < table_size) lengths_[next_++] = static_cast<uint16_t>(length_of(prefix) + 1);
+    const uint32_t pixels = is_known ? lengths_[code] : lengths_[prefix] + 1u;
+    // Of code 0 at last, in steps of one entry each: no string has as many pixels as the table has entries.
+    if (next_ < table_size) lengths_[next_++] = static_cast<uint16_t>(lengths_[prefix] + 1);
     previous_ = code;
     return pixels;
 }
