@@ -34,7 +34,8 @@ void finish_colours(PngDecodeState &state) {
     RowOfSamples row = row_of_samples(depth);
     uint8_t pixels[sizeof FinishedColours::pixels] = {};
     state.currentRow = row.bytes;
-    visit_row(state, [&](const auto &load) { write_row_as(state.outputFormat, load, 0, 1 << depth, pixels, 4); });
+    visit_row_of_few_colours(
+        state, [&](const auto &load) { write_row_as(state.outputFormat, load, 0, 1 << depth, pixels, 4); });
     state.currentRow = nullptr;
 
     auto *const colours = reinterpret_cast<FinishedColours *>(state.rowBuffers);

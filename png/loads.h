@@ -155,29 +155,44 @@ constexpr int32_t row_kind(uint32_t colour_type, uint32_t depth) {
     return static_cast<int32_t>(colour_type * 32 + depth);
 }
 
-// Calls `visit` with the load for the state's current row: the list of the layouts that a PNG can have.
+// The key as rows of 8 bits are compared with it.
+inline ColourKey narrow_key(const PngDecodeState &state) {
+    return {state.transparentKeyRed, state.transparentKeyGreen, state.transparentKeyBlue};
+}
+
+// Calls `visit` with the load for the state's current row, whose samples each stand for one of at most 256 colours. For
+// any other row it is not called.
 template <class Visit>
-void visit_row(const PngDecodeState &state, Visit &&visit) {
+void visit_row_of_few_colours(const PngDecodeState &state, Visit &&visit) {
     const uint8_t *const row = state.currentRow;
-    const ColourKey key = {state.transparentKeyRed, state.transparentKeyGreen, state.transparentKeyBlue};
-    const ColourKey whole_key = {state.transparentSamples[0], state.transparentSamples[1], state.transparentSamples[2]};
     switch (row_kind(state.colourType, state.bitDepth)) {
     case row_kind(0, 1): return visit(NarrowGreyRow<1>{row});
     case row_kind(0, 2): return visit(NarrowGreyRow<2>{row});
     case row_kind(0, 4): return visit(NarrowGreyRow<4>{row});
-    case row_kind(0, 8): return visit_grey_row<1>(state, key, visit);
-    case row_kind(0, 16): return visit_grey_row<2>(state, whole_key, visit);
-    case row_kind(2, 8): return visit_rgb_row<1>(state, key, visit);
-    case row_kind(2, 16): return visit_rgb_row<2>(state, whole_key, visit);
     case row_kind(3, 1): return visit_palette_row<1>(state, visit);
     case row_kind(3, 2): return visit_palette_row<2>(state, visit);
     case row_kind(3, 4): return visit_palette_row<4>(state, visit);
     case row_kind(3, 8): return visit_palette_row<8>(state, visit);
+    default: return;
+    }
+}
+
+// The same for all the layouts that a PNG can have.
+template <class Visit>
+void visit_row(const PngDecodeState &state, Visit &&visit) {
+    const uint8_t *const row = state.currentRow;
+    const ColourKey key = narrow_key(state);
+    const ColourKey whole_key = {state.transparentSamples[0], state.transparentSamples[1], state.transparentSamples[2]};
+    switch (row_kind(state.colourType, state.bitDepth)) {
+    case row_kind(0, 8): return visit_grey_row<1>(state, key, visit);
+    case row_kind(0, 16): return visit_grey_row<2>(state, whole_key, visit);
+    case row_kind(2, 8): return visit_rgb_row<1>(state, key, visit);
+    case row_kind(2, 16): return visit_rgb_row<2>(state, whole_key, visit);
     case row_kind(4, 8): return visit(GreyAlphaRow<1>{row});
     case row_kind(4, 16): return visit(GreyAlphaRow<2>{row});
     case row_kind(6, 8): return visit(RgbaRow<1>{row});
     case row_kind(6, 16): return visit(RgbaRow<2>{row});
-    default: return;
+    default: return visit_row_of_few_colours(state, visit);
     }
 }
 

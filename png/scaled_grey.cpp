@@ -38,7 +38,7 @@ void write_scaled_grey_row(PngDecodeState &state, uint32_t x_step, uint32_t y_st
     const int64_t output_row = int64_t{y / state.imageHeight} - state.firstRowOfCall;
     const bool visible = state.output.size != 0 && state.rowsWritten < state.imageHeight;
     if (visible)
-        visit_row(state, [&](const auto &load) {
+        visit_grey_row<1>(state, narrow_key(state), [&](const auto &load) {
             write_columns(state, load, x_step, scaled_width, row_position(state, area, output_row));
         });
     x = x_step >> 1;
