@@ -104,12 +104,15 @@ constexpr SymbolEntry make_symbol_entry(uint32_t symbol) {
 }
 
 template <HuffmanAlphabetKind kind>
-inline constexpr auto symbol_entries = [] {
+constexpr auto make_symbol_entries() {
     std::array<SymbolEntry, kind == HUFFMAN_DISTANCE ? 32 : largest_alphabet> entries{};
     for (uint32_t symbol = 0; symbol < entries.size(); ++symbol)
         entries[symbol] = make_symbol_entry<kind>(symbol);
     return entries;
-}();
+}
+
+template <HuffmanAlphabetKind kind>
+inline constexpr auto symbol_entries = make_symbol_entries<kind>();
 
 template <HuffmanAlphabetKind kind>
 constexpr uint32_t entry_of(uint32_t symbol, uint32_t length) {

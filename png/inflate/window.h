@@ -35,9 +35,9 @@ inline void produced(Window &window, uint32_t count) {
     window.total += count;
 }
 
-// Makes room again once everything has been handed over.
+// Makes room again, once everything has been handed over.
 inline void slide(Window &window) {
-    if (!is_full(window) || window.delivered != window.write) return;
+    if (!is_full(window)) return;
     std::memcpy(window.bytes, window.bytes + window.write - window_size, window_size);
     window.write = window.delivered = window_size;
 }
