@@ -22,7 +22,6 @@ size_t compare(const std::vector<Input> &inputs, uint32_t step) {
     size_t compared = 0;
     uint32_t number = 0;
     for (const Decode &decode : decodes_of(inputs)) {
-        if (decode.input->format != fuzz::Format::png) continue;
         for (uint32_t format = number % step; format <= 12; format += step) {
             const Setting setting = nth_setting(*decode.input, format, number++ * 7 % setting_count);
             const size_t size = output_size(decode, setting).value_or(0);
@@ -37,7 +36,7 @@ size_t compare(const std::vector<Input> &inputs, uint32_t step) {
     return compared;
 }
 
-TEST(SweepsKernels, every_kind_of_code_decodes_png_to_the_same_bytes) {
+TEST(SweepsKernels, every_kind_of_code_decodes_to_the_same_bytes) {
     const std::vector<Input> small = small_inputs();
     EXPECT_GT(compare(small, by_extent(5u, 1u, 1u)), 100u);
     EXPECT_GT(compare(cut_short(small), by_extent(5u, 1u, 1u)), 100u);
