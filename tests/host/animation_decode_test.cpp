@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "PelmAnimation.h"
+#include "tests/gif/support/lzw_encoder.h"
 #include "tests/host/support.h"
 #include "tests/support/small_gif.h"
 
@@ -102,6 +103,16 @@ SmallGif animation_of(std::mt19937 &random) {
     return gif;
 }
 
+void append_blocks(Bytes &bytes, const Bytes &data) {
+    for (size_t at = 0; at < data.size(); at += 255) {
+        const auto from = data.begin() + static_cast<ptrdiff_t>(at);
+        const auto size = static_cast<uint8_t>(std::min<size_t>(255, data.size() - at));
+        bytes.push_back(size);
+        bytes.insert(bytes.end(), from, from + size);
+    }
+    bytes.push_back(0);
+}
+
 constexpr uint32_t kinds[] = {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM};
 
 TEST(AnimationDecode, delivers_the_frames_that_are_told_of_sound_files) {
@@ -120,6 +131,31 @@ TEST(AnimationDecode, delivers_the_frames_that_are_told_of_files_cut_anywhere) {
         if (testing::Test::HasFailure()) return;
     }
     EXPECT_GT(compared, whole.size() / 2);
+}
+
+// More codes than the table has entries, cleared when it is full or not.
+TEST(AnimationDecode, delivers_the_frames_that_are_told_of_full_tables) {
+    std::mt19937 random(4);
+    Bytes pixels(120 * 120);
+    for (uint8_t &pixel : pixels)
+        pixel = static_cast<uint8_t>(random());
+    for (const bool clears : {false, true})
+        for (const int bits : {2, 8}) {
+            SmallGif gif;
+            gif.width = gif.height = 120;
+            Bytes bytes = gif_header(gif);
+            for (int frame = 0; frame < 2; ++frame) {
+                const Bytes descriptor = {',', 0, 0, 0, 0, 120, 0, 120, 0, 0, static_cast<uint8_t>(bits)};
+                bytes.insert(bytes.end(), descriptor.begin(), descriptor.end());
+                Bytes reduced = pixels;
+                for (uint8_t &pixel : reduced)
+                    pixel = static_cast<uint8_t>(pixel & ((1 << bits) - 1));
+                append_blocks(bytes, test::lzw_data(reduced, bits, {.clears_full_table = clears}));
+            }
+            bytes.push_back(';');
+            for (const uint32_t kind : kinds)
+                EXPECT_TRUE(compare(bytes, kind)) << bits << " bits";
+        }
 }
 
 // Codes that stand for anything, data that goes on behind the last pixel, blocks in places where none belongs.

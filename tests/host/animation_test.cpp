@@ -128,6 +128,10 @@ TEST(Animation, loop_counts_stand_in_two_kinds_of_application_blocks) {
     EXPECT_EQ(loops(test::gif_loop_block("NETSCAPE3.0", 9)), -1);
     EXPECT_EQ(loops(test::gif_loop_block("NETSCAPE2.0x", 9)), -1);
     EXPECT_EQ(loops({'!', 0xFF, 3, 1, 9, 0, 0}), -1);
+    Bytes short_of_a_byte = test::gif_loop_block("NETSCAPE2.0", 9);
+    short_of_a_byte[14] = 2; // the block's size; its last byte is then an empty block's
+    short_of_a_byte[17] = 0;
+    EXPECT_EQ(loops(short_of_a_byte), -1);
     Bytes other_first = test::gif_loop_block("NETSCAPE2.0", 9);
     const Bytes buffer_size = {5, 2, 0, 0, 1, 0};
     other_first.insert(other_first.begin() + 14, buffer_size.begin(), buffer_size.end());
@@ -193,6 +197,7 @@ TEST(Animation, sources_that_cannot_be_moved_back_are_told_at_once) {
     const Described got = described(source); // would wait for ever if it read on: the pipe stays open
     EXPECT_EQ(got.error, ESPIPE);
     EXPECT_EQ(got.animation.frameCount, 0u);
+    EXPECT_EQ(described(source).error, ESPIPE) << "also when it has been read from before";
 }
 
 TEST(Animation, headers_that_the_decoder_refuses_are_no_gif) {
@@ -213,6 +218,8 @@ TEST(Animation, headers_that_the_decoder_refuses_are_no_gif) {
     EXPECT_EQ(described(first_of(sound, 25)).error, 0);
     PelmAnimation animation;
     EXPECT_EQ(PelmAnimation_Describe(nullptr, &animation, nullptr, 0), EINVAL);
+    Source source;
+    EXPECT_EQ(PelmAnimation_Describe(&source, nullptr, nullptr, 0), EINVAL);
 }
 
 TEST(Animation, tells_how_the_file_ends) {

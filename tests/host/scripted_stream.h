@@ -11,6 +11,8 @@
 
 namespace pelm::host_test {
 
+constexpr int no_reason = -1; // a failure that leaves errno at 0
+
 // One answer of the stream: bytes, an errno value when there are none, or an end when there is neither.
 struct Answer {
     std::string bytes;
@@ -33,7 +35,7 @@ private:
         if (self.next_ == self.answers_.size()) return 0;
         const Answer &answer = self.answers_[self.next_++];
         if (answer.error != 0) {
-            errno = answer.error;
+            errno = answer.error == no_reason ? 0 : answer.error;
             return -1;
         }
         if (answer.bytes.size() > room) abort();

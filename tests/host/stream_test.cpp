@@ -71,6 +71,14 @@ TEST(HostStream, bytes_before_a_failure_are_delivered_first) {
     EXPECT_EQ(PelmHost_ReadError(&source), 0);
 }
 
+TEST(HostStream, a_failure_without_a_reason_is_an_input_error) {
+    const ScriptedStream stream({{"", no_reason}});
+    Source source;
+    ASSERT_EQ(PelmHost_OpenStream(&source, stream.file(), 0), 0);
+    EXPECT_EQ(read_result(source), -1);
+    EXPECT_EQ(PelmHost_ReadError(&source), EIO);
+}
+
 TEST(HostStream, a_seek_stops_before_a_failure_and_leaves_it_to_the_next_read) {
     const ScriptedStream stream({{"abc"}, {"", EIO}});
     Source source;
