@@ -41,6 +41,20 @@ TEST_F(BmpBandCalls, no_rows_decode_nothing_and_keep_the_decode) {
         }
 }
 
+TEST_F(BmpBandCalls, rows_farther_than_any_buffer_reaches_are_not_written) {
+    // So many rows, each as long as steps can be, or as addresses go.
+    const int32_t box_width = sizeof(void *) == 8 ? (1 << 29) - 1 : 1 << 20;
+    TestSource source(PELM_SOURCE_MEMORY, file_bytes(noise_bmp(rgb24, 3, 5, false)));
+    ImageDecodeInfo info = marked_info(&source.source, {7, 0, 0, box_width, 60});
+    uint8_t byte = background; // of a buffer that nothing may be written to
+    EXPECT_EQ(ZOTARPELMI_DecodeBMPIterLine(&info, &byte, box_width, 60, 0), 1);
+    EXPECT_NE(info.decoderState, nullptr);
+    EXPECT_EQ(ZOTARPELMI_DecodeBMPIterLine(&info, &byte, box_width, 60, INT_MAX), 1);
+    EXPECT_EQ(info.decoderState, nullptr);
+    EXPECT_EQ(byte, background);
+    EXPECT_TRUE(host.live_blocks().empty());
+}
+
 TEST_F(BmpBandCalls, failed_reads_end_a_band_and_count_its_rows) {
     TestSource source(PELM_SOURCE_STREAM, file_bytes(noise_bmp(rgb24, 9, 7, true)), 28);
     host.faults.failing_read = 4; // header, two rows, and the third

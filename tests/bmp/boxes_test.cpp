@@ -63,6 +63,19 @@ TEST_F(BmpBoxes, an_empty_or_negative_box_is_not_written) {
                 }
 }
 
+TEST_F(BmpBoxes, a_box_so_negative_that_a_side_cannot_be_named_is_refused) {
+    for (const auto &[width, height] : {std::pair{5, 7}, {7, 5}})
+        for (const bool sideways : {false, true}) {
+            // The other side follows from the box's, and is longer the longer that side of the image is.
+            const bool by_width = (width < height) != sideways;
+            const BmpRequest request{7, sideways ? 1 : 0, 0, by_width ? INT32_MIN : 4, by_width ? 4 : INT32_MIN};
+            EXPECT_EQ(
+                decode_to_null(file_bytes(noise_bmp(rgb24, width, height, false)), PELM_SOURCE_MEMORY, request).result,
+                0)
+                << width << " x " << height << ", " << described(request);
+        }
+}
+
 TEST_F(BmpBoxes, giant_boxes_without_an_output_do_no_harm) {
     for (const uint32_t kind : all_kinds)
         for (const int32_t box_width : {1, 7, 65536, 1 << 30, INT32_MAX})

@@ -322,6 +322,24 @@ TEST_F(BmpLine, another_width_on_a_later_call_moves_the_margin_and_stays_within_
     EXPECT_EQ(info.decoderState, nullptr);
 }
 
+TEST_F(BmpLine, a_band_whose_rows_are_too_long_to_step_over_is_passed_over) {
+    for (const uint32_t format : {0u, 1u, 7u}) {
+        host.reset();
+        const BmpFile file = noise_bmp(rgb24, 3, 4, false);
+        const Bytes whole = BmpSubject(file).expect({format, 0, 0, 3, 4}).output;
+        TestSource source(PELM_SOURCE_MEMORY, file_bytes(file));
+        ImageDecodeInfo info{};
+        info.input = &source.source;
+        info.outputFormat = format;
+        uint8_t byte = background; // of a buffer that nothing may be written to
+        EXPECT_EQ(ZOTARPELMI_DecodeBMPLine(&info, &byte, 1 << 30, 4, 2), 1);
+        EXPECT_EQ(byte, background);
+        Bytes output(whole.size() / 2, background);
+        EXPECT_EQ(ZOTARPELMI_DecodeBMPLine(&info, output.data(), 3, 4, 2), 1);
+        EXPECT_EQ(output, Bytes(whole.end() - static_cast<ptrdiff_t>(output.size()), whole.end()));
+    }
+}
+
 TEST_F(BmpLine, a_null_output_passes_over_the_band) {
     const BmpFile file = noise_bmp(rgb24, 3, 4, false);
     TestSource source(PELM_SOURCE_STREAM, file_bytes(file));

@@ -351,6 +351,24 @@ TEST_P(BmpBands, no_rows_write_nothing) {
         }
 }
 
+TEST_P(BmpBands, a_decoder_for_another_depth_does_nothing) {
+    TestSource source(PELM_SOURCE_MEMORY, file_bytes(noise_bmp(GetParam(), 11, 13, false)));
+    Bytes output(1200, background);
+    ImageDecodeInfo info = marked_info(&source.source, {1, 0, 0, 20, 20});
+    BmpState *const state = PELMI_BMP_Initialize(&info, 20, 20, output.data());
+    ASSERT_NE(state, nullptr);
+    using Decoder = int32_t(BmpState *, intptr_t, int32_t);
+    const std::pair<uint32_t, Decoder *> decoders[] = {{1, PELMI_BMP_Decode1bitBMP},   {4, PELMI_BMP_Decode4bitBMP},
+                                                       {8, PELMI_BMP_Decode8bitBMP},   {16, PELMI_BMP_Decode16bitBMP},
+                                                       {24, PELMI_BMP_Decode24bitBMP}, {32, PELMI_BMP_Decode32bitBMP}};
+    for (const auto &[depth, decoder] : decoders) {
+        if (depth == state->bitsPerPixel) continue;
+        EXPECT_EQ(decoder(state, state->outputCursor, 13), 1) << depth;
+    }
+    EXPECT_EQ(output, Bytes(1200, background));
+    PELMI_BMP_DeleteDecInfo(state);
+}
+
 TEST_P(BmpBands, a_cursor_outside_the_buffer_writes_nothing) {
     for (const intptr_t cursor : {intptr_t{-5000}, intptr_t{5000}, intptr_t{1} << 29, -(intptr_t{1} << 29)})
         for (const int32_t side : {20, 5}) {
