@@ -152,6 +152,26 @@ TEST_F(GifFrames, after_the_last_frame_a_call_begins_again) {
         EXPECT_EQ(outputs[i], outputs[i - 3]);
 }
 
+TEST_F(GifFrames, a_local_table_that_was_taken_away_is_not_missed) {
+    const auto expected = frames_of(three_frames().file(), request);
+    host.reset();
+    TestSource source(PELM_SOURCE_STREAM, three_frames().file());
+    ImageDecodeInfo info{};
+    info.input = &source.source;
+    info.outputFormat = 7;
+    Bytes output(width * height * 4, gif_background);
+    for (const DeliveredFrame &frame : expected) { // the second one has a table of its own
+        EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&info, output.data(), width, height), frame.result);
+        EXPECT_EQ(output, frame.output);
+        EXPECT_EQ(info.colorTableState, frame.words.colour_table_state);
+        if (info.localColorTable != nullptr) ZOTARPELM_OsFree(info.localColorTable);
+        info.localColorTable = nullptr;
+    }
+    free_tables(info);
+    EXPECT_TRUE(host.live_blocks().empty());
+    EXPECT_TRUE(host.violations.empty());
+}
+
 TEST_F(GifFrames, the_output_arguments_of_later_calls_are_ignored) {
     const auto expected = frames_of(three_frames().file(), request);
     host.reset();

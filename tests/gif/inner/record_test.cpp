@@ -21,6 +21,13 @@ TEST_F(GifRecord, deleting_takes_null_and_records_of_which_anything_is_missing) 
     }
 }
 
+TEST_F(GifRecord, none_is_made_for_requests_without_an_input) {
+    EXPECT_EQ(PELMI_InitializeGIF(nullptr, 1, 1, 0, nullptr), nullptr);
+    ImageDecodeInfo info{};
+    EXPECT_EQ(PELMI_InitializeGIF(&info, 1, 1, 0, nullptr), nullptr);
+    EXPECT_TRUE(host.allocations.empty());
+}
+
 TEST_F(GifRecord, creating_allocates_in_order) {
     GifDecoderState *const state = static_cast<GifDecoderState *>(ZOTARPELM_OsMalloc(sizeof(GifDecoderState)));
     *state = GifDecoderState{};

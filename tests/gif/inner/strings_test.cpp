@@ -53,6 +53,9 @@ TEST_F(GifStrings, a_string_is_written_whole_and_its_first_pixel_told) {
     EXPECT_EQ(PELMI_TranslateCode(7, &tables, 2, buffer.data()), 3);
     EXPECT_EQ(buffer, (Bytes{99, 99, 3, 200, 1, 99, 99, 99}));
     EXPECT_EQ(PELMI_TranslateCode(2, &tables, 7, buffer.data()), 2);
+    EXPECT_EQ(PELMI_TranslateCode(4000, &tables, 6, buffer.data()), 0) << "a code without a string is one pixel of 0";
+    EXPECT_EQ(buffer[6], 0);
+    buffer[6] = 99;
     PELMI_WriteCharacter(55, 0, buffer.data());
     EXPECT_EQ(buffer, (Bytes{55, 99, 3, 200, 1, 99, 99, 2}));
 }
