@@ -283,5 +283,16 @@ TEST_F(PngCorrupt, a_single_flipped_bit_in_any_chunk_fails) {
         }
 }
 
+TEST_F(PngCorrupt, a_stream_that_ends_within_its_header_fails) {
+    const Picture picture = noise_picture(rgb, 8, 12, 8);
+    for (const uint32_t kind : all_source_kinds)
+        for (const Call call : {Call::one_shot, Call::iterative, Call::line}) {
+            reset();
+            const Outcome outcome = decoded(picture, {0x78}, kind, call);
+            EXPECT_EQ(flaws(outcome, 0), "") << "kind " << kind;
+            EXPECT_EQ(outcome.output, background(outcome.output.size()));
+        }
+}
+
 } // namespace
 } // namespace pelm::test

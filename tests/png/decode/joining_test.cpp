@@ -208,6 +208,37 @@ TEST_F(PngJoining, the_last_of_two_headers_counts) {
         EXPECT_EQ(one_shot_difference(picture, file_of(chunks), kind, request), "");
 }
 
+TEST_F(PngJoining, a_header_that_makes_the_image_indexed_keeps_the_flag_of_transparency_and_has_no_palette) {
+    Picture black = noise_picture(indexed, 8, 9, 9);
+    black.palette = Bytes(768, 0);
+    Picture plain = noise_picture(grey, 8, 9, 9);
+    plain.transparency = Bytes{0, 7};
+    std::vector<Chunk> chunks = chunks_of(png_of(black)); // IHDR, PLTE, IDAT, IEND
+    const std::vector<Chunk> before = chunks_of(png_of(plain));
+    chunks[1] = chunks[0];
+    chunks[0] = before[1]; // tRNS
+    chunks.insert(chunks.begin(), before[0]);
+    for (const uint32_t kind : all_source_kinds)
+        for (const Request &box : {Request{1, 0, 9, 9}, Request{7, 0, 9, 9}, Request{7, 0, 5, 5}})
+            EXPECT_EQ(one_shot_difference(black, file_of(chunks), kind, box), "");
+}
+
+TEST_F(PngJoining, a_header_that_makes_the_image_grey_keeps_a_key_that_no_grey_has) {
+    const Picture plain = noise_picture(grey, 8, 9, 9);
+    Picture coloured = noise_picture(rgb, 8, 9, 9);
+    std::vector<Chunk> chunks = chunks_of(png_of(plain)); // IHDR, IDAT, IEND
+    const uint8_t first = plain.rows[0];
+    const uint8_t other = static_cast<uint8_t>(first + 1);
+    for (const Bytes &key : {Bytes{0, first, 0, other, 0, first}, Bytes{0, first, 0, first, 0, other}}) {
+        coloured.transparency = key;
+        const std::vector<Chunk> before = chunks_of(png_of(coloured));
+        std::vector<Chunk> both = chunks;
+        both.insert(both.begin(), {before[0], before[1]});
+        for (const uint32_t kind : all_source_kinds)
+            EXPECT_EQ(one_shot_difference(plain, file_of(both), kind, {7, 0, 9, 9}), "");
+    }
+}
+
 TEST_F(PngJoining, chunks_in_an_unusual_order_are_taken) {
     const Picture coloured = with_transparency(noise_picture(indexed, 8, 9, 9));
     std::vector<Chunk> chunks = chunks_of(png_of(coloured)); // IHDR, PLTE, tRNS, IDAT, IEND

@@ -163,4 +163,29 @@ TEST(ChunkStream, a_host_that_claims_more_than_it_was_asked_for_does_no_harm) {
     parse.run();
 }
 
+// A chunk's data are read once for its checksum, and once more to be used.
+TEST(ChunkStream, data_of_which_only_a_part_comes_again_fail) {
+    for (const uint8_t colour_type : Bytes{0, 2, 3}) {
+        Png png = small_png(colour_type, 8);
+        png.trns = Bytes(colour_type == 0 ? 2 : 6, 1);
+        if (colour_type == 3) png.trns = Bytes{1, 2};
+        const Bytes file = build(png);
+        const int chunks = colour_type == 3 ? 5 : 4;
+        for (int again = 2; again <= 1 + chunks; ++again)
+            for (size_t part = 1; part <= file.size(); ++part) {
+                Parse parse(file, PELM_SOURCE_STREAM);
+                TestHost::get().faults.short_reads_from = again;
+                TestHost::get().faults.most_per_read = static_cast<int32_t>(part);
+                TestHost::get().faults.failing_reads_from = again + 1;
+                const uint32_t code = parse.run();
+                // Only the last chunk is followed by nothing; its checksum is stepped over.
+                if (again == 1 + chunks && part >= file.size() - 4)
+                    ASSERT_EQ(code, PNG_DONE) << part << " bytes";
+                else
+                    ASSERT_TRUE(code == PNG_BAD_DATA || code == PNG_FORMAT_ERROR)
+                        << "type " << int{colour_type} << ", read " << again << ", " << part << " bytes: " << code;
+            }
+    }
+}
+
 } // namespace pelm::test

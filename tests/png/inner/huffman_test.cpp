@@ -224,6 +224,7 @@ TEST(Huffman, freeing_a_pool_clears_the_pointer_and_an_empty_one_is_left_alone) 
     PELMI_FreePNGHuffmanMemory(&pool);
     EXPECT_EQ(pool, nullptr);
     PELMI_FreePNGHuffmanMemory(&pool);
+    PELMI_FreePNGHuffmanMemory(nullptr);
     EXPECT_TRUE(host.live_blocks().empty());
     EXPECT_TRUE(host.violations.empty());
     EXPECT_EQ(host.allocations, std::vector<uint32_t>{50008});

@@ -2,6 +2,7 @@
 
 #include "png/blend.h"
 #include "png/entry.h"
+#include "png/pixels.h"
 #include "tests/png/inner/parse.h"
 
 namespace pelm::test {
@@ -209,6 +210,24 @@ TEST(Blend, full_alpha_gives_the_new_colour_and_none_the_old_pixel) {
     for (uint32_t old = 0; old < 0x10000; old += 11) {
         EXPECT_EQ(APPLY_ALPHA_RGB_TO_SHORT(200, 100, 50, 255, old), 200 >> 3 << 11 | 100 >> 2 << 5 | 50 >> 3);
         EXPECT_EQ(APPLY_ALPHA_RGB_TO_SHORT(200, 100, 50, 0, old), old);
+    }
+}
+
+TEST(RowPosition, stays_far_outside_every_buffer_where_it_would_not_fit_64_bits) {
+    PngDecodeState state{};
+    state.outputFormat = PELM_FORMAT_RGBA8888;
+    constexpr int64_t far_outside = int64_t{1} << 61;
+    for (const uint32_t stride : {0u, 1u, 1000u, 0x7FFFFFFFu, 0xFFFFFFFFu}) {
+        state.outputStride = stride;
+        for (const int64_t row : {int64_t{0}, int64_t{1}, int64_t{-1}, int64_t{1} << 26, int64_t{1} << 28,
+                                  -(int64_t{1} << 28), int64_t{1} << 32, -(int64_t{1} << 32)}) {
+            const auto exact = static_cast<__int128>(row) * stride * 4;
+            const int64_t got = row_position(state, 12, row);
+            if (exact <= far_outside && exact >= -far_outside)
+                EXPECT_EQ(got, static_cast<int64_t>(exact) + 12) << row << " rows of " << stride;
+            else
+                EXPECT_EQ(got, row > 0 ? far_outside : -far_outside) << row << " rows of " << stride;
+        }
     }
 }
 

@@ -21,6 +21,17 @@ TEST_F(PngInterlacedCentres, every_layout_is_scaled_in_every_format) {
         }
 }
 
+TEST_F(PngInterlacedCentres, pictures_of_a_few_pixels_are_scaled_like_larger_ones) {
+    for (const Layout layout : all_layouts)
+        for (const bool transparent : {false, true}) {
+            const Picture picture = interlaced_noise(layout, transparent, 3, 2);
+            const Bytes file = interlaced_file_of(picture);
+            for (const auto &[width, height] : {std::pair(2, 1), std::pair(1, 2), std::pair(1, 1)})
+                for (const uint32_t format : written_formats)
+                    ASSERT_EQ(interlaced_difference(picture, file, PELM_SOURCE_MEMORY, {format, 0, width, height}), "");
+        }
+}
+
 TEST_F(PngInterlacedCentres, every_rotation_and_placement_is_honoured) {
     for (const Layout layout : {Layout{rgb, 8}, Layout{rgb_alpha, 8}, Layout{indexed, 4}, Layout{grey, 16}})
         for (const auto &[width, height] : {std::pair(30u, 14u), std::pair(14u, 30u), std::pair(20u, 20u)}) {
