@@ -50,9 +50,14 @@ inline uint64_t load_little(const uint8_t *from) {
 
 template <uint32_t count>
 inline void store_little(uint8_t *to, uint64_t bytes) {
-    constexpr uint32_t head = count >= 8 ? 8 : count >= 4 ? 4 : count >= 2 ? 2 : 1;
-    std::memcpy(to, &bytes, head);
-    if constexpr (count > head) store_little<count - head>(to + head, bytes >> (8 * head));
+    if constexpr (std::has_single_bit(count)) {
+        static_assert(count <= 8);
+        std::memcpy(to, &bytes, count);
+    } else {
+        constexpr uint32_t head = count > 4 ? 4 : 2;
+        std::memcpy(to, &bytes, head);
+        store_little<count - head>(to + head, bytes >> (8 * head));
+    }
 }
 
 // `count` bytes into the first lanes; zeros in the others.

@@ -23,8 +23,7 @@ struct Codes {
 };
 
 void assign_codes(const uint8_t *code_lengths, uint32_t count, Codes &codes) {
-    for (uint32_t &number : codes.of_length)
-        number = 0;
+    std::fill_n(codes.of_length, longest_code + 1, 0u);
     uint16_t used[largest_alphabet]; // small blocks use few symbols
     uint32_t used_count = 0;
     for (uint32_t symbol = 0; symbol < count; ++symbol) {
