@@ -114,7 +114,7 @@ Step take_extension(Walk &walk) {
 void take_image_data(Walk &walk, uint32_t code_size) {
     PelmAnimationFrame &frame = walk.current;
     const uint64_t wanted = uint64_t{frame.width} * frame.height;
-    const uint64_t pixels = code_size > largest_code_size ? 0 : follow_gif_data(walk.reader, code_size, wanted);
+    const uint64_t pixels = follow_gif_data(walk.reader, code_size, wanted);
     const bool is_whole = pixels >= wanted;
     frame.completeRows = is_whole ? frame.height : static_cast<uint32_t>(pixels / frame.width);
 }

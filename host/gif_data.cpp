@@ -6,6 +6,7 @@
 namespace pelm::host {
 namespace {
 
+constexpr uint32_t largest_code_size = 11; // above it the decoder gives up before the first pixel
 constexpr uint32_t table_size = 4096;
 constexpr uint32_t widest_code = 12; // bits
 
@@ -103,6 +104,7 @@ uint32_t Strings::pixels_of(uint32_t code) {
 } // namespace
 
 uint64_t follow_gif_data(GifReader &reader, uint32_t min_code_size, uint64_t wanted) {
+    if (min_code_size > largest_code_size) return 0;
     Codes codes(reader, min_code_size);
     Strings strings(codes.end_code() + 1);
     uint64_t pixels = 0;

@@ -7,9 +7,6 @@
 
 namespace pelm::host {
 
-// Above it the decoder gives up before the first pixel.
-constexpr uint32_t largest_code_size = 11;
-
 // Follows the codes from the first sub-block on until they stand for `wanted` pixels, or end. Leaves the reader behind
 // the last byte used. Returns the number of pixels, which may exceed what is wanted.
 uint64_t follow_gif_data(GifReader &reader, uint32_t min_code_size, uint64_t wanted);

@@ -165,6 +165,7 @@ constexpr void enter_codes(const SortedCodes &sorted, uint32_t length, uint32_t 
         uint32_t *const to = entries + sorted.codes[i];
         if (seconds != nullptr && (entry & entry_is_literal) != 0)
             for (uint32_t k = 0; k < repeats; ++k)
+                // NOLINTNEXTLINE(clang-analyzer-core.UndefinedBinaryOperatorResult): not seen to be filled that far
                 to[k << length] = entry + seconds[k];
         else
             for (uint32_t k = 0; k < repeats; ++k)
