@@ -28,8 +28,8 @@ constexpr uint32_t exceptional_distance = 1u << 31;
 constexpr uint32_t widest_literal_table = 11; // bits
 constexpr uint32_t widest_distance_table = 9;
 
-// With the entries of longer codes. More than that are left to the trees; no code of fewer symbols than an alphabet has
-// comes near it.
+// With the entries of longer codes, which take more where a few symbols have short codes and hundreds have long ones:
+// what does not fit is left to the trees.
 constexpr uint32_t literal_table_entries = (1u << widest_literal_table) + 1024;
 constexpr uint32_t distance_table_entries = (1u << widest_distance_table) + 512;
 

@@ -58,6 +58,35 @@ TEST(Inflate, over_subscribed_codes_decode_as_their_tree_says) {
     expect_inflates_to(zlib_stream(deflate), text_bytes("bb"));
 }
 
+// Half of the long literal codes find their place in the table taken, and the longest distances.
+TEST(Inflate, codes_that_the_tables_have_no_room_for_are_decoded_by_their_trees) {
+    DynamicCodes codes;
+    codes.literal_lengths = {1, 2, 3, 4};
+    codes.literal_lengths.resize(4 + 254, 12);
+    codes.literal_lengths.resize(4 + 254 + 16, 15);
+    codes.distance_lengths = {1, 2, 3, 4, 5, 7, 8, 9};
+    codes.distance_lengths.resize(8 + 17, 10);
+    codes.distance_lengths.insert(codes.distance_lengths.end(), {11, 12, 13, 14, 15, 15});
+    Tokens tokens;
+    for (uint32_t byte = 0; byte < 256; ++byte)
+        tokens.push_back(literal(byte));
+    for (uint32_t distance_symbol = 0; distance_symbol < 30; ++distance_symbol)
+        tokens.push_back(match_of_symbols(257 + distance_symbol % 17, 0, distance_symbol, 0));
+    Deflate deflate;
+    deflate.dynamic(codes, tokens, Last::no);
+    deflate.fixed({}, Last::yes);
+    expect_inflates_to(zlib_stream(deflate), expand(tokens));
+
+    Inflater inflater(zlib_stream(deflate), {.pause_at_blocks = true});
+    ASSERT_EQ(inflater.call(), Stop::block_ended);
+    const BlockCodes &made = *inflater.state.dynamic;
+    const uint32_t *const literals_end = made.literal_entries + (1u << made.literals.width);
+    const uint32_t *const distances_end = made.distance_entries + (1u << made.distances.width);
+    EXPECT_EQ(std::count(made.literal_entries, literals_end, exceptional_literal), 64);
+    EXPECT_EQ(std::count(made.distance_entries, distances_end, exceptional_distance), 1);
+    EXPECT_TRUE(made.trees_are_grown);
+}
+
 // Whether the code that no block uses still says what the test has made it say.
 TEST(Inflate, a_block_with_the_code_lengths_of_the_one_before_is_decoded_by_its_tables) {
     const Tokens text = literals(text_bytes("some text"));
