@@ -47,7 +47,7 @@ SetUp read_palette(BmpState &state, const BmpHeader &header, InputSource &input,
         copy_as_far_as_there(input, bmp_header_bytes, state.palette, bytes);
         return SetUp::done;
     }
-    const int32_t got = ZOTARPELM_Read_IO(&input, state.palette, bytes);
+    const int32_t got = read_or_zeros(input, state.palette, bytes);
     // Required: a short palette leaves the record and the palette allocated (docs/oddities.md, "Refusals that leak").
     return got < bytes && calls == Calls::direct ? SetUp::abandoned : SetUp::done;
 }

@@ -65,6 +65,13 @@ bool parse_info_fields(const uint8_t (&bytes)[bmp_header_bytes], BmpHeader &head
     return set_height(header, read_i32le(bytes + 22));
 }
 
+int32_t read_or_zeros(InputSource &input, uint8_t *bytes, int32_t count) {
+    const int32_t got = ZOTARPELM_Read_IO(&input, bytes, count);
+    for (int32_t i = got < 0 ? 0 : got; i < count; ++i)
+        bytes[i] = 0;
+    return got;
+}
+
 SetUp read_header(InputSource &input, uint8_t (&bytes)[bmp_header_bytes]) {
     switch (input.kind) {
     case PELM_SOURCE_MEMORY:

@@ -37,6 +37,9 @@ constexpr int32_t row_bytes(int32_t width, int32_t bits_per_pixel) {
 
 bool is_bmp(const uint8_t (&bytes)[bmp_header_bytes]);
 
+// Bytes that do not arrive are zeros, whatever the host has left there. What the host says of their number.
+int32_t read_or_zeros(InputSource &input, uint8_t *bytes, int32_t count);
+
 SetUp read_header(InputSource &input, uint8_t (&bytes)[bmp_header_bytes]);
 
 // What the bytes say, and whether such images are decoded.

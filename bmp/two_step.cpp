@@ -9,13 +9,6 @@
 namespace pelm {
 namespace {
 
-// Bytes that do not arrive count as zeros, whatever the host has left there.
-void read_parked_header(InputSource &input, BmpState &state) {
-    const int32_t got = ZOTARPELM_Read_IO(&input, state.headerCopy, bmp_header_bytes);
-    for (int32_t i = got < 0 ? 0 : got; i < bmp_header_bytes; ++i)
-        state.headerCopy[i] = 0;
-}
-
 // Tells the caller the image's size. False when it does not fit the words.
 bool report_size(ImageDecodeInfo &info, BmpState &state, const BmpHeader &header, int32_t divisor) {
     const int64_t width = int64_t{header.width} / divisor;
@@ -76,7 +69,7 @@ int32_t ZOTARPELMI_PreInitBMP(ImageDecodeInfo *info, int32_t sampleDivisor) {
     if (state == nullptr) return PELM_RESULT_FAILED;
 
     state->input = &input;
-    pelm::read_parked_header(input, *state);
+    pelm::read_or_zeros(input, state->headerCopy, pelm::bmp_header_bytes);
     // Required: the record stays allocated (docs/oddities.md, "Refusals that leak").
     if (!pelm::is_bmp(state->headerCopy)) return PELM_RESULT_FAILED;
     pelm::BmpHeader header{};

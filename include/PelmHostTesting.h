@@ -41,6 +41,7 @@ typedef struct PelmTestFaults {
     uint32_t pausingPoll;
     uint32_t pausingPollsFrom;
     int32_t pausingStatus; /* at first 1 */
+    int32_t readFilling;   /* what a read leaves of its room holds this byte; 0: stays as it was */
 } PelmTestFaults;
 
 /* The faults that are looked at, to be changed at any time. */

@@ -61,6 +61,7 @@ int32_t ZOTARPELM_Read_IO(InputSource *source, void *destination, int32_t count)
     const PelmTestFaults &faults = account().faults;
     const uint64_t number = ++counters.reads;
     if (count < 0) call.violate("read a negative number of bytes");
+    if (count > 0 && faults.readFilling != 0) memset(destination, faults.readFilling, static_cast<size_t>(count));
     if (struck(number, faults.failingRead, faults.failingReadsFrom)) {
         ++counters.faultyReads;
         return call.record.result = faults.failingReadResult;

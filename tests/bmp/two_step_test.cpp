@@ -93,11 +93,12 @@ TEST_F(BmpTwoStep, memory_without_data_is_not_asked_for_a_header) {
     EXPECT_TRUE(host.reads.empty());
 }
 
-TEST_F(BmpTwoStep, header_bytes_that_do_not_arrive_are_zeros) {
+TEST_F(BmpTwoStep, header_bytes_that_do_not_arrive_are_zeros_whatever_the_host_leaves_there) {
     const Bytes whole = file_bytes(noise_bmp(rgb24, 0x0707, 0x0505, false));
     for (const uint32_t kind : all_kinds)
         for (size_t length = 0; length < 54; ++length) {
             host.reset();
+            host.faults.read_filling = 0x5A;
             TestSource source(kind, Bytes(whole.begin(), whole.begin() + static_cast<ptrdiff_t>(length)));
             ImageDecodeInfo info{};
             info.input = &source.source;
@@ -197,9 +198,10 @@ TEST_F(BmpTwoStep, there_are_as_many_palette_entries_as_fit_before_the_pixels_an
         }
 }
 
-TEST_F(BmpTwoStep, a_palette_that_does_not_arrive_is_black) {
+TEST_F(BmpTwoStep, a_palette_that_does_not_arrive_is_black_whatever_the_host_leaves_there) {
     for (const uint32_t kind : stream_kinds) {
         host.reset();
+        host.faults.read_filling = 0x5A;
         TestSource source(kind, file_bytes(noise_bmp(variant_named("eight_bits"), 9, 7, false)), 60);
         host.faults.failing_read = 2;
         const BmpRequest request{1, 0, 0, 9, 7};

@@ -141,6 +141,17 @@ TEST_F(HostForTests, reads_fail_come_short_and_claim_too_much_as_asked) {
     EXPECT_EQ(counters.faultyReads, 3u);
 }
 
+TEST_F(HostForTests, fills_what_reads_leave_of_their_room_as_asked) {
+    PelmTest_OpenSource(&source, PELM_SOURCE_STREAM, &bytes, 0);
+    EXPECT_EQ(read(4), 4);
+    faults.readFilling = 'x';
+    EXPECT_EQ(read(8), 2);
+    EXPECT_EQ(memcmp(buffer, "efxxxxxx\0", 9), 0);
+    faults.failingRead = 3;
+    EXPECT_EQ(read(9), -1);
+    EXPECT_EQ(memcmp(buffer, "xxxxxxxxx\0", 10), 0);
+}
+
 TEST_F(HostForTests, stops_and_pauses_at_the_polls_asked_for) {
     faults.pausingPoll = 2;
     faults.pausingStatus = 7;

@@ -58,6 +58,7 @@ void TestHost::hand_over_faults() const {
     to.mostPerRead = faults.most_per_read;
     to.overclaimingReadsFrom = static_cast<uint32_t>(faults.overclaiming_reads_from);
     to.filling = faults.block_filling;
+    to.readFilling = faults.read_filling;
 }
 
 void TestHost::record(const PelmTestCall &call) {

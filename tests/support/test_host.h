@@ -36,6 +36,7 @@ struct HostFaults {
     int32_t most_per_read = 1;
     int overclaiming_reads_from = 0; // from this read on the result is 1000 above what was delivered
     uint8_t block_filling = 0xA5;
+    uint8_t read_filling = 0; // what reads leave of their room; 0: as it was
 };
 
 class TestHost {
