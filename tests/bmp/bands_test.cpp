@@ -131,32 +131,27 @@ TEST_F(BmpBands, more_rows_than_the_image_has_decode_it_at_once) {
         EXPECT_TRUE(equals_one_call(subject, {1, 0, 0, 9, 7}, rows)) << rows;
 }
 
-TEST_F(BmpBands, a_picture_of_250_rows_takes_three_iterations) {
-    for (const uint32_t kind : seekable_kinds)
-        for (const bool top_down : {false, true}) {
-            BmpSubject subject(noise_bmp(rgb24, 3, 250, top_down), kind, 100);
-            const BmpRequest request{1, 0, 0, 3, 250};
-            std::vector<int32_t> results;
-            const BmpCalls calls = [&](ImageDecodeInfo &info, uint8_t *output) {
-                do
-                    results.push_back(ZOTARPELMI_DecodeBMPIter(&info, output, 3, 250));
-                while (results.back() == PELM_RESULT_MORE);
-                return results.back();
-            };
-            EXPECT_EQ(subject.difference(calls, request, subject.expect(request)), "");
-            EXPECT_EQ(results, (std::vector<int32_t>{4, 4, 1}));
-        }
-}
-
-TEST_F(BmpBands, a_picture_of_up_to_100_rows_takes_one_iteration) {
-    for (const int32_t height : {1, 99, 100}) {
-        BmpSubject subject(noise_bmp(rgb24, 3, height, false));
-        const BmpRequest request{1, 0, 0, 3, height};
-        const BmpCalls calls = [&](ImageDecodeInfo &info, uint8_t *output) {
-            return ZOTARPELMI_DecodeBMPIter(&info, output, 3, height);
-        };
-        EXPECT_EQ(subject.difference(calls, request, subject.expect(request)), "");
-    }
+TEST_F(BmpBands, an_iteration_is_100_rows) {
+    struct Case {
+        int32_t height;
+        std::vector<int32_t> results;
+    };
+    for (const Case &c : {Case{1, {1}}, Case{99, {1}}, Case{100, {1}}, Case{101, {4, 1}}, Case{200, {4, 1}},
+                          Case{201, {4, 4, 1}}, Case{250, {4, 4, 1}}})
+        for (const uint32_t kind : seekable_kinds)
+            for (const bool top_down : {false, true}) {
+                BmpSubject subject(noise_bmp(rgb24, 3, c.height, top_down), kind, 100);
+                const BmpRequest request{1, 0, 0, 3, c.height};
+                std::vector<int32_t> results;
+                const BmpCalls calls = [&](ImageDecodeInfo &info, uint8_t *output) {
+                    do
+                        results.push_back(ZOTARPELMI_DecodeBMPIter(&info, output, 3, c.height));
+                    while (results.back() == PELM_RESULT_MORE);
+                    return results.back();
+                };
+                EXPECT_EQ(subject.difference(calls, request, subject.expect(request)), "");
+                EXPECT_EQ(results, c.results) << c.height << " rows";
+            }
 }
 
 TEST_F(BmpBands, pictures_of_which_nothing_is_left_are_complete_at_once) {

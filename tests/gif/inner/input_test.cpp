@@ -109,6 +109,7 @@ TEST_F(GifHeaderFields, a_graphic_control_is_kept_for_all_images_that_have_none)
     file.image({1, 2, 3, 4, true}, Bytes(12, 1), 2, distinct_table(2, 8));
     file.control({3, 9, 0xFFFF, 0xE2}).image({0, 0, 1, 1}, {1}, 3);
     file.image({0, 0, 1, 1}, {1}, 3);
+    file.control({}).image({0, 0, 1, 1}, {1}, 3);
     DecodingRecord record(file.trailer().bytes, own_size(4, 4));
     ASSERT_NE(record.state, nullptr);
     GifDecoderState &state = *record.state;
@@ -136,6 +137,8 @@ TEST_F(GifHeaderFields, a_graphic_control_is_kept_for_all_images_that_have_none)
     // What is left of the image's data is walked over.
     ASSERT_EQ(record.seek(), 1);
     EXPECT_EQ(state.transparentIndex, 9);
+    ASSERT_EQ(record.seek(), 1);
+    EXPECT_EQ(state.transparentIndex, -1) << "a control without one takes the last one's place";
     EXPECT_EQ(record.seek(), 3);
 }
 

@@ -73,6 +73,19 @@ TEST_F(GifRows, rows_at_and_below_the_end_of_the_screen_are_not_written) {
     EXPECT_EQ(output[8 * 20 + 3], 255);
 }
 
+TEST_F(GifRows, each_image_has_its_own_colours) {
+    GifFile file;
+    file.screen(1, 1, {10, 20, 30, 1, 2, 3}).image({0, 0, 1, 1}, {0}, 2);
+    file.image({0, 0, 1, 1}, {0}, 2, {40, 50, 60, 4, 5, 6}).image({0, 0, 1, 1}, {1}, 2);
+    Bytes output(4);
+    DecodingRecord record(file.trailer().bytes, own_size(1, 1), false, output.data());
+    for (const Bytes &expected : {Bytes{10, 20, 30, 255}, Bytes{40, 50, 60, 255}, Bytes{1, 2, 3, 255}}) {
+        ASSERT_EQ(record.seek(), 1);
+        EXPECT_EQ(PELMI_DecodeGIFImage(&record.source.source, record.state, record.state->outputStart), 1);
+        EXPECT_EQ(output, expected);
+    }
+}
+
 TEST_F(GifRows, a_line_refuses_interlaced_images_and_says_what_it_used_up) {
     Bytes output(5 * 9 * 4, gif_background);
     DecodingRecord record(still_file({5, 9, 2, true}).bytes, own_size(5, 9), false, output.data());
