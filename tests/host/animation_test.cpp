@@ -132,6 +132,9 @@ TEST(Animation, loop_counts_stand_in_two_kinds_of_application_blocks) {
     short_of_a_byte[14] = 2; // the block's size; its last byte is then an empty block's
     short_of_a_byte[17] = 0;
     EXPECT_EQ(loops(short_of_a_byte), -1);
+    Bytes comment = test::gif_loop_block("NETSCAPE2.0", 9);
+    comment[1] = 0xFE;
+    EXPECT_EQ(loops(comment), -1);
     Bytes other_first = test::gif_loop_block("NETSCAPE2.0", 9);
     const Bytes buffer_size = {5, 2, 0, 0, 1, 0};
     other_first.insert(other_first.begin() + 14, buffer_size.begin(), buffer_size.end());
@@ -291,6 +294,17 @@ TEST(Animation, rows_that_the_data_lacks_are_counted) {
     Bytes unreadable = test::gif_image(SmallFrame{});
     unreadable[10] = 12;
     EXPECT_EQ(described(gif_header(SmallGif{}) + unreadable + Bytes{';'}).frames[0].completeRows, 0u);
+}
+
+// The decoder takes a block only when a byte follows it.
+TEST(Animation, the_data_of_a_block_that_ends_with_the_file_do_not_count) {
+    Bytes file = gif_header(SmallGif{}) + test::gif_image(SmallFrame{});
+    ASSERT_EQ(file.back(), 0);
+    EXPECT_EQ(described(file).frames[0].completeRows, 3u);
+    file.pop_back();
+    const Described got = described(file);
+    ASSERT_EQ(got.animation.frameCount, 1u);
+    EXPECT_EQ(got.frames[0].completeRows, 0u);
 }
 
 int aborted = 0;

@@ -1,6 +1,8 @@
 // Regular files as seekable streams.
 #include <cerrno>
+#include <climits>
 
+#include <sys/inotify.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 
@@ -101,8 +103,13 @@ TEST(HostFile, what_is_not_a_regular_file_is_refused) {
 TEST(HostFile, a_pipe_is_refused_without_being_opened) {
     const std::string path = testing::TempDir() + "pelm_host_fifo_" + std::to_string(getpid());
     ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
+    const int watcher = inotify_init1(IN_NONBLOCK);
+    ASSERT_GE(inotify_add_watch(watcher, path.c_str(), IN_OPEN), 0);
     Source source;
     EXPECT_EQ(PelmHost_OpenFile(&source, path.c_str(), 0), ESPIPE);
+    char event[sizeof(inotify_event) + NAME_MAX + 1];
+    EXPECT_EQ(read(watcher, event, sizeof event), -1) << "it was opened";
+    close(watcher);
     unlink(path.c_str());
 }
 

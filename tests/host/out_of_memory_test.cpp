@@ -1,4 +1,5 @@
-// What happens when the C library has no memory. The linker leads the host's malloc and realloc here.
+// What happens when the C library has no memory, and what is given back to it. The linker leads the host's malloc,
+// realloc and free here.
 #include <cerrno>
 #include <cstdlib>
 
@@ -7,6 +8,7 @@
 
 namespace {
 int failing_call = 0; // counted down; 0: none fails
+int blocks = 0;       // that were allocated and not freed
 
 bool fails_now() {
     return failing_call > 0 && --failing_call == 0;
@@ -16,11 +18,18 @@ bool fails_now() {
 extern "C" {
 void *__real_malloc(size_t size);
 void *__real_realloc(void *block, size_t size);
+void __real_free(void *block);
 void *__wrap_malloc(size_t size) {
-    return fails_now() ? nullptr : __real_malloc(size);
+    void *const block = fails_now() ? nullptr : __real_malloc(size);
+    if (block != nullptr) ++blocks;
+    return block;
 }
 void *__wrap_realloc(void *block, size_t size) {
     return fails_now() ? nullptr : __real_realloc(block, size);
+}
+void __wrap_free(void *block) {
+    if (block != nullptr) --blocks;
+    __real_free(block);
 }
 }
 
@@ -49,6 +58,22 @@ TEST(HostOutOfMemory, there_is_no_control) {
     PelmHostControl *const control = PelmHost_NewControl();
     failing_call = 0;
     EXPECT_EQ(control, nullptr);
+}
+
+TEST(HostOutOfMemory, controls_are_freed_when_nobody_uses_them_any_more) {
+    for (const auto use : {PelmHost_UseForThread, PelmHost_UseForProcess}) {
+        const int before = blocks;
+        PelmHostControl *const first = PelmHost_NewControl(), *const second = PelmHost_NewControl();
+        use(first);
+        PelmHost_ReleaseControl(first);
+        EXPECT_EQ(blocks, before + 2);
+        use(second);
+        EXPECT_EQ(blocks, before + 1) << "another one took the first one's place";
+        PelmHost_ReleaseControl(second);
+        EXPECT_EQ(blocks, before + 1);
+        use(nullptr);
+        EXPECT_EQ(blocks, before);
+    }
 }
 
 TEST(HostOutOfMemory, an_allocation_without_a_control_fails) {

@@ -86,6 +86,19 @@ TEST_F(GifRows, each_image_has_its_own_colours) {
     }
 }
 
+TEST_F(GifRows, pixels_behind_an_images_last_one_are_not_the_next_images) {
+    GifFile file;
+    file.screen(2, 1, {10, 20, 30, 40, 50, 60});
+    file.image({0, 0, 2, 1}, {0, 0, 0}, 2).image({0, 0, 2, 1}, {1, 1}, 2); // 0, and the string of two behind it
+    Bytes output(8);
+    DecodingRecord record(file.trailer().bytes, own_size(2, 1), false, output.data());
+    for (const Bytes &expected : {Bytes{10, 20, 30, 255}, Bytes{40, 50, 60, 255}}) {
+        ASSERT_EQ(record.seek(), 1);
+        EXPECT_EQ(PELMI_DecodeGIFImage(&record.source.source, record.state, record.state->outputStart), 1);
+        EXPECT_EQ(Bytes(output.begin(), output.begin() + 4), expected);
+    }
+}
+
 TEST_F(GifRows, a_line_refuses_interlaced_images_and_says_what_it_used_up) {
     Bytes output(5 * 9 * 4, gif_background);
     DecodingRecord record(still_file({5, 9, 2, true}).bytes, own_size(5, 9), false, output.data());
