@@ -113,6 +113,16 @@ TEST(Reader, failed_reads_are_an_end) {
     }
 }
 
+TEST(Reader, reads_that_claim_too_much_count_as_what_was_asked_for) {
+    for (const uint32_t left : {0u, 1u, 3u}) {
+        Reader reader(bytes_40000);
+        TestHost::get().faults.overclaiming_reads_from = 1;
+        reader.place(16384, 16384 - left, left);
+        EXPECT_EQ(left == 0 ? __checkbuffer_util1(&reader.input, 4) : __checkbuffer_util2(&reader.input, 4), 1u);
+        EXPECT_EQ(reader.words(), (Words{0, 16384, 16384, 32768 - left}));
+    }
+}
+
 TEST(Reader, memory_is_never_refilled) {
     Reader reader(bytes_40000, PELM_SOURCE_MEMORY);
     EXPECT_EQ(__checkbuffer_util1(&reader.input, 1), 11u);
