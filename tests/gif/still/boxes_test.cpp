@@ -102,6 +102,23 @@ TEST_F(GifBoxes, absurd_boxes_decode_the_image_and_write_nothing_outside) {
                     }
 }
 
+TEST_F(GifBoxes, a_buffer_whose_rows_are_too_long_to_step_over_is_refused) {
+    for (const uint32_t format : gif_formats)
+        for (uint32_t turns = 0; turns < 4; ++turns) {
+            host.reset();
+            const int32_t row_pixels = most / static_cast<int32_t>(gif_pixel_bytes(format)) + 1;
+            TestSource source(PELM_SOURCE_MEMORY, still_file({7, 5}).bytes);
+            ImageDecodeInfo info{};
+            info.input = &source.source;
+            info.outputFormat = format;
+            info.flags = turns * PELM_ROTATE_90;
+            uint8_t byte = gif_background; // of a buffer that nothing may be written to
+            EXPECT_EQ(ZOTARPELMI_DecodeGIF(&info, &byte, row_pixels, 5), 0) << format << ", turned " << turns;
+            EXPECT_EQ(byte, gif_background);
+            EXPECT_TRUE(host.live_blocks().empty());
+        }
+}
+
 TEST_F(GifBoxes, absurd_boxes_do_not_stop_line_calls) {
     const Bytes file = still_file({9, 7, 8}).bytes;
     for (const int32_t width : {least, -1, 0, 1, 5, 70000})

@@ -209,9 +209,9 @@ TEST_F(PngJoining, the_last_of_two_headers_counts) {
 }
 
 TEST_F(PngJoining, a_header_that_makes_the_image_indexed_keeps_the_flag_of_transparency_and_has_no_palette) {
-    Picture black = noise_picture(indexed, 8, 9, 9);
+    Picture black = noise_picture(indexed, 8, 60, 40); // enough pixels to repay a table of finished colours
     black.palette = Bytes(768, 0);
-    Picture plain = noise_picture(grey, 8, 9, 9);
+    Picture plain = noise_picture(grey, 8, 60, 40);
     plain.transparency = Bytes{0, 7};
     std::vector<Chunk> chunks = chunks_of(png_of(black)); // IHDR, PLTE, IDAT, IEND
     const std::vector<Chunk> before = chunks_of(png_of(plain));
@@ -219,7 +219,7 @@ TEST_F(PngJoining, a_header_that_makes_the_image_indexed_keeps_the_flag_of_trans
     chunks[0] = before[1]; // tRNS
     chunks.insert(chunks.begin(), before[0]);
     for (const uint32_t kind : all_source_kinds)
-        for (const Request &box : {Request{1, 0, 9, 9}, Request{7, 0, 9, 9}, Request{7, 0, 5, 5}})
+        for (const Request &box : {Request{1, 0, 60, 40}, Request{7, 0, 60, 40}, Request{7, 0, 31, 22}})
             EXPECT_EQ(one_shot_difference(black, file_of(chunks), kind, box), "");
 }
 
