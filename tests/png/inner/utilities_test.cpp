@@ -221,10 +221,11 @@ TEST(RowPosition, stays_far_outside_every_buffer_where_it_would_not_fit_64_bits)
         state.outputStride = stride;
         for (const int64_t row : {int64_t{0}, int64_t{1}, int64_t{-1}, int64_t{1} << 26, int64_t{1} << 28,
                                   -(int64_t{1} << 28), int64_t{1} << 32, -(int64_t{1} << 32)}) {
-            const auto exact = static_cast<__int128>(row) * stride * 4;
+            int64_t exact;
+            const bool is_too_much = __builtin_mul_overflow(row * 4, int64_t{stride}, &exact);
             const int64_t got = row_position(state, 12, row);
-            if (exact <= far_outside && exact >= -far_outside)
-                EXPECT_EQ(got, static_cast<int64_t>(exact) + 12) << row << " rows of " << stride;
+            if (!is_too_much && exact <= far_outside && exact >= -far_outside)
+                EXPECT_EQ(got, exact + 12) << row << " rows of " << stride;
             else
                 EXPECT_EQ(got, row > 0 ? far_outside : -far_outside) << row << " rows of " << stride;
         }
