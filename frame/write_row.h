@@ -9,7 +9,6 @@
 
 #include <algorithm>
 #include <cstddef>
-#include <type_traits>
 
 #include "frame/clip.h"
 #include "frame/formats.h"
@@ -17,20 +16,34 @@
 
 namespace pelm {
 
-template <class Store, class Load, class Step>
-inline void write_run(const Load &load, int32_t from, int32_t count, uint8_t *__restrict out, Step step) {
+template <class Store, class Load>
+inline void write_run(const Load &load, int32_t from, int32_t count, uint8_t *__restrict out) {
+    for (ptrdiff_t i = 0; i < count; ++i)
+        Store::put(out + i * Store::size, load(from + static_cast<int32_t>(i)));
+}
+
+// Required for ARM with NEON: where GCC vectorizes this loop it takes every pixel of four bytes for aligned, and uses a
+// store (vstr) that traps where one is not.
+#if defined(__arm__) && defined(__GNUC__) && !defined(__clang__)
+#define PELM_ONE_BY_ONE [[gnu::noinline, gnu::optimize("no-tree-vectorize")]]
+#else
+#define PELM_ONE_BY_ONE
+#endif
+
+template <class Store, class Load>
+PELM_ONE_BY_ONE inline void write_distant_run(const Load &load, int32_t from, int32_t count, uint8_t *__restrict out,
+                                              ptrdiff_t step) {
     for (ptrdiff_t i = 0; i < count; ++i)
         Store::put(out + i * step, load(from + static_cast<int32_t>(i)));
 }
+
+#undef PELM_ONE_BY_ONE
 
 template <class Store, class Load>
 concept IsSwizzle = requires {
     Load::channels;
     Store::channels;
 };
-
-template <class Store>
-using DenseStep = std::integral_constant<ptrdiff_t, Store::size>;
 
 // Whole groups of pixels as bytes, the others one by one: those at the end, and groups that blend.
 template <class Store, class Load>
@@ -39,7 +52,7 @@ void write_run_in_groups(const Load &load, int32_t from, int32_t count, uint8_t 
     while (count > 0) {
         const int32_t done = swizzle(how, load.row + ptrdiff_t{from} * how.source_size, count, out);
         const int32_t singly = std::min(count - done, done == 0 ? 32 : 4);
-        write_run<Store>(load, from + done, singly, out + ptrdiff_t{done} * Store::size, DenseStep<Store>());
+        write_run<Store>(load, from + done, singly, out + ptrdiff_t{done} * Store::size);
         from += done + singly;
         count -= done + singly;
         out += ptrdiff_t{done + singly} * Store::size;
@@ -52,7 +65,7 @@ inline void write_run_wide(const Load &load, int32_t from, int32_t count, uint8_
     const int32_t wide = std::max(count - 3, 0);
     for (ptrdiff_t i = 0; i < wide; ++i)
         Store::put_wide(out + i * Store::size, load(from + static_cast<int32_t>(i)));
-    write_run<Store>(load, from + wide, count - wide, out + ptrdiff_t{wide} * Store::size, DenseStep<Store>());
+    write_run<Store>(load, from + wide, count - wide, out + ptrdiff_t{wide} * Store::size);
 }
 
 // Pixels one behind the other.
@@ -69,7 +82,7 @@ inline void write_dense_run(const Load &load, int32_t from, int32_t count, uint8
     if constexpr (requires { Store::put_wide; } && Store::size == 3)
         write_run_wide<Store>(load, from, count, out);
     else
-        write_run<Store>(load, from, count, out, DenseStep<Store>());
+        write_run<Store>(load, from, count, out);
 }
 
 // Columns from .. from + count - 1, the first one to `out`, `step` bytes apart.
@@ -78,7 +91,7 @@ inline void write_run_as(const Load &load, int32_t from, int32_t count, uint8_t 
     if (step == Store::size)
         write_dense_run<Store>(load, from, count, out);
     else
-        write_run<Store>(load, from, count, out, step);
+        write_distant_run<Store>(load, from, count, out, step);
 }
 
 // This switch is the list of formats that the full-colour decoders write; any other code writes nothing.
