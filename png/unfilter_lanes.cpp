@@ -1,6 +1,6 @@
 #include "png/unfilter_lanes.h"
 
-#include "png/flat_runs.h"
+#include "png/paeth_runs.h"
 #include "png/unfilter_chains.h"
 #include "png/unfilter_plain.h"
 
@@ -189,10 +189,11 @@ struct SmallPaethChain {
         return i;
     }
 
-    Bytes16 left_pixel() const {
-        uint32_t pixel = left.channels[0];
-        if constexpr (unit == 2) pixel |= left.channels[1] << 8;
-        return std::bit_cast<Bytes16>(Words4{pixel, 0, 0, 0});
+    // The next pixel is the one at `row`, below that at `above`.
+    void go_on_at(const uint8_t *row, const uint8_t *above) {
+        for (uint32_t k = 0; k < unit; ++k)
+            left.channels[k] = *(row - unit + k);
+        last_up = load_bytes<unit>(above - unit);
     }
 };
 
@@ -204,21 +205,27 @@ struct LargePaethChain {
         return undo_by_pixels<unit>(chain, row, above, length);
     }
 
-    Bytes16 left_pixel() const { return narrow(chain.lanes.left); }
+    void go_on_at(const uint8_t *row, const uint8_t *above) {
+        chain.go_on(load_bytes<unit>(row - unit), load_bytes<unit>(above - unit));
+    }
 };
 
-// What goes from pixel to pixel stays as it is in a flat run.
 template <uint32_t unit, class Chain>
 uint32_t undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length) {
-    using Runs = FlatRuns<unit>;
+    using Runs = PaethRuns<unit>;
     Chain chain;
-    if (!Runs::are_common(row, above, length)) return chain.undo(row, above, length);
-    uint32_t i = chain.undo(row, above, Runs::length);
-    for (; length - i >= Runs::length; i += Runs::length)
-        if (Runs::is_flat(row + i, above + i))
-            Runs::fill(row + i, chain.left_pixel());
-        else
-            chain.undo(row + i, above + i, Runs::length);
+    if (!Runs::are_common(row, length)) return chain.undo(row, above, length);
+    uint32_t i = chain.undo(row, above, Runs::length); // which has no pixel on its left
+    for (bool is_behind = false; length - i >= Runs::length; i += Runs::length) {
+        if (Runs::undo(row + i, above + i)) {
+            is_behind = true;
+            continue;
+        }
+        if (is_behind) chain.go_on_at(row + i, above + i);
+        is_behind = false;
+        chain.undo(row + i, above + i, Runs::length);
+    }
+    chain.go_on_at(row + i, above + i);
     return i + chain.undo(row + i, above + i, length - i);
 }
 

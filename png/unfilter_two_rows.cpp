@@ -1,7 +1,7 @@
 #include "png/unfilter_two_rows.h"
 
 #include "frame/processor.h"
-#include "png/flat_runs.h"
+#include "png/paeth_runs.h"
 #include "png/unfilter_chains.h"
 #include "png/unfilter_plain.h"
 
@@ -106,8 +106,8 @@ bool is_chain(uint8_t filter) {
 }
 
 template <uint32_t unit>
-bool is_flat(const TwoRows &rows) {
-    return rows.first_filter == FILTER_PAETH && FlatRuns<unit>::are_common(rows.first, rows.above, rows.length);
+bool has_runs(const TwoRows &rows) {
+    return rows.first_filter == FILTER_PAETH && PaethRuns<unit>::are_common(rows.first, rows.length);
 }
 
 } // namespace
@@ -115,10 +115,10 @@ bool is_flat(const TwoRows &rows) {
 bool two_rows_pay(const TwoRows &rows) {
     if (!is_chain(rows.first_filter) || !is_chain(rows.second_filter) || kernels() < Kernels::lanes) return false;
     switch (rows.distance) {
-    case 3: return !is_flat<3>(rows);
-    case 4: return !is_flat<4>(rows);
-    case 6: return !is_flat<6>(rows);
-    case 8: return !is_flat<8>(rows);
+    case 3: return !has_runs<3>(rows);
+    case 4: return !has_runs<4>(rows);
+    case 6: return !has_runs<6>(rows);
+    case 8: return !has_runs<8>(rows);
     default: return false;
     }
 }

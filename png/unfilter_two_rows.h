@@ -18,7 +18,7 @@ struct TwoRows {
 };
 
 // Whether it is faster than a row after the other: Average and Paeth, in any order, for pixels of three bytes and more,
-// unless a first Paeth row is flat in many places, which a row alone makes use of. Both rows are as they were filtered.
+// unless many runs of a first Paeth row are zero, which a row alone makes use of. Both rows are as they were filtered.
 bool two_rows_pay(const TwoRows &rows);
 
 // The first row below `above` and the second one below the first, in place, where two_rows_pay. Nothing outside the

@@ -88,7 +88,7 @@ TEST(UnfilterTwoRows, pay_for_average_and_paeth_of_large_pixels) {
     EXPECT_FALSE(two_rows_pay(rows));
 }
 
-TEST(UnfilterTwoRows, do_not_pay_where_the_first_one_is_flat) {
+TEST(UnfilterTwoRows, do_not_pay_where_the_first_one_has_runs) {
     Bytes first(3000), second(3000);
     const Bytes above(3000, 77);
     TwoRows rows = {first.data(), second.data(), above.data(), 3000, 0, FILTER_PAETH, FILTER_PAETH};

@@ -149,6 +149,31 @@ TEST(Unfilter, flat_places_equal_the_plain_definition) {
         }
 }
 
+// Zeros as residuals are what makes a row that is mostly like the one above it, whatever that looks like.
+TEST(Unfilter, rows_like_those_above_come_back) {
+    Rows at_start(Edge::start), at_end(Edge::end);
+    for (const uint8_t distance : distances)
+        for (uint32_t seed = 1; seed <= 400; ++seed) {
+            Random random(seed);
+            const size_t length = 50 + seed * 5;
+            const Bytes above = noise_bytes(length, seed);
+            Bytes row = above;
+            for (uint32_t changes = random() % 6; changes > 0; --changes) {
+                const size_t from = random() % length, end = std::min<size_t>(length, from + 1 + random() % 40);
+                for (size_t i = from; i < end; ++i)
+                    row[i] = static_cast<uint8_t>(random() >> 24);
+            }
+            const Bytes filtered = filtered_row(4, row, above, distance);
+            for (const Kernels kind : all_kernels()) {
+                const WithKernels with(kind);
+                for (Rows *rows : {&at_start, &at_end})
+                    ASSERT_EQ(rows->by_decoder(4, {filtered.begin() + 1, filtered.end()}, above, distance), row)
+                        << "distance " << int{distance} << " length " << length << ", kernels "
+                        << static_cast<int>(kind);
+            }
+        }
+}
+
 TEST(Unfilter, undoes_what_an_encoder_did) {
     for (const uint8_t distance : distances)
         for (uint8_t filter = 0; filter <= 4; ++filter) {
