@@ -2,6 +2,7 @@
 #include <climits>
 
 #include "tests/bmp/bands.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

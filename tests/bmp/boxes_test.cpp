@@ -4,6 +4,7 @@
 
 #include "bmp/working.h"
 #include "tests/bmp/expectations.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

@@ -3,6 +3,7 @@
 
 #include "bmp/working.h"
 #include "tests/bmp/bands.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

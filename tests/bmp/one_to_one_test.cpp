@@ -1,5 +1,6 @@
 // Pictures that the box holds: every depth, format, rotation, placement and row order, against the model.
 #include "tests/bmp/expectations.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

@@ -1,6 +1,7 @@
 // Scaled size, placement in the box, and the cursor and steps of every rotation.
 #include "bmp/working.h"
 #include "tests/bmp/expectations.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

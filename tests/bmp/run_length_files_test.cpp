@@ -1,6 +1,7 @@
 // Run-length files of an own encoder, and of noise, from every source and in every direction; and their memory.
 #include "bmp/working.h"
 #include "tests/bmp/coded.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

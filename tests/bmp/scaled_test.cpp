@@ -1,5 +1,6 @@
 // Pictures that are reduced to fit or stretched: sample points, averages, row orders and odd ratios, against the model.
 #include "tests/bmp/expectations.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

@@ -1,5 +1,6 @@
 // Files cut at every length, from every kind of source, 1:1 and scaled: which rows still land, against the model.
 #include "tests/bmp/expectations.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

@@ -5,6 +5,7 @@
 #include "tests/bounds/ways.h"
 #include "tests/bounds/work.h"
 #include "tests/png/support/png_builder.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -175,16 +176,15 @@ TEST_F(PngRepetition, chunks_in_streams_cost_two_reads_and_one_read_buffer_each)
 }
 
 TEST_F(PngRepetition, a_million_chunks_of_one_byte_are_one_image) {
-    const bool quick = std::getenv("PELM_TEST_QUICK") != nullptr;
     Png png = ordinary();
-    if (quick) {
+    if (quick()) {
         png = {.width = 200, .height = 167, .colour_type = 2, .depth = 8};
         png.rows = noise_rows(png, 5);
         png.level = 0;
     }
     png.idat_size = 1;
     const size_t chunks = stream_of(png).size();
-    ASSERT_GE(chunks, quick ? 100000u : 1000000u);
+    ASSERT_GE(chunks, quick() ? 100000u : 1000000u);
     const Work got = work_of(build(png), png, Way::png, PELM_SOURCE_MEMORY);
     // Quadratic, in steps of 2048.
     EXPECT_GE(got.bytes_moved, moved_by_index(chunks));

@@ -6,6 +6,7 @@
 #include "PelmAnimation.h"
 #include "tests/gif/support/lzw_encoder.h"
 #include "tests/host/support.h"
+#include "tests/support/quick.h"
 #include "tests/support/small_gif.h"
 
 namespace pelm::host_test {
@@ -162,7 +163,7 @@ TEST(AnimationDecode, delivers_the_frames_that_are_told_of_full_tables) {
 TEST(AnimationDecode, delivers_the_frames_that_are_told_of_damaged_files) {
     std::mt19937 random(3);
     size_t compared = 0;
-    const int rounds = std::getenv("PELM_TEST_QUICK") != nullptr ? 300 : 3000;
+    const int rounds = pelm::test::quick() ? 300 : 3000;
     for (int round = 0; round < rounds; ++round) {
         SCOPED_TRACE(round);
         Bytes bytes = gif_bytes(animation_of(random));

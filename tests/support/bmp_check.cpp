@@ -66,11 +66,6 @@ bool same_words(const BmpExpectation &expected, const BmpDecode &got) {
 
 } // namespace
 
-bool quick() {
-    static const bool asked = getenv("PELM_TEST_QUICK") != nullptr;
-    return asked;
-}
-
 std::string described(const BmpFile &file, size_t length) {
     std::ostringstream text;
     text << file.width << " x " << file.height << ", " << file.bits << " bits, compression " << file.compression

@@ -12,9 +12,6 @@ namespace pelm::test {
 
 inline constexpr uint8_t background = 0x5A;
 
-// True when the environment asks for fewer cases (PELM_TEST_QUICK): emulators and sanitizers.
-bool quick();
-
 std::string described(const BmpFile &file, size_t length);
 std::string described(const BmpRequest &request);
 

@@ -8,12 +8,14 @@
 
 #include <gtest/gtest.h>
 
+#include "tests/support/quick.h"
+
 namespace pelm::sweeps {
 
 template <class Amount>
 Amount by_extent(Amount quick, Amount usual, Amount all) {
     if (getenv("PELM_TEST_LONG") != nullptr) return all;
-    return getenv("PELM_TEST_QUICK") != nullptr ? quick : usual;
+    return test::quick() ? quick : usual;
 }
 
 inline bool is_complete() {

@@ -1,4 +1,5 @@
 // The tool tells why a BMP is refused by rules of its own; they must be those of the decoder.
+#include "tests/support/quick.h"
 #include "tools/bmp_description.h"
 
 #include <algorithm>

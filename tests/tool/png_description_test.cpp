@@ -1,4 +1,5 @@
 // The tool tells why a PNG is refused by rules of its own; they must be those of the decoder.
+#include "tests/support/quick.h"
 #include "tools/png_description.h"
 
 #include <gtest/gtest.h>

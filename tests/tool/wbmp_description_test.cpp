@@ -1,4 +1,5 @@
 // The tool recognises WBMPs, and tells why one is refused, by rules of its own; they must be those of the decoder.
+#include "tests/support/quick.h"
 #include "tools/wbmp_description.h"
 
 #include <algorithm>

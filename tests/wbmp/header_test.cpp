@@ -1,4 +1,5 @@
 // Which headers are accepted and what they say; sizes that lie, data that is cut anywhere, reads that fall short.
+#include "tests/support/quick.h"
 #include "tests/wbmp/decoding.h"
 
 namespace pelm::test {

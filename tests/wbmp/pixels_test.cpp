@@ -1,4 +1,5 @@
 // Every pixel of every size, from both sources, into every format, pixel for pixel, reduced and stretched.
+#include "tests/support/quick.h"
 #include "tests/wbmp/decoding.h"
 
 namespace pelm::test {

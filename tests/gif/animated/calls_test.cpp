@@ -15,6 +15,19 @@ Animation three_frames() {
     return animation;
 }
 
+// A request for these, which nothing has been called with yet.
+struct Fresh {
+    TestSource source{PELM_SOURCE_STREAM, three_frames().file()};
+    ImageDecodeInfo info{};
+    Bytes output = Bytes(width * height * 4, gif_background);
+
+    Fresh() {
+        info.input = &source.source;
+        info.outputFormat = 7;
+    }
+    int32_t next() { return ZOTARPELMI_DecodeAGIF(&info, output.data(), width, height); }
+};
+
 class GifFrames : public GifTest {
 protected:
     static Bytes raw(const ColourTable &table) {
@@ -67,17 +80,14 @@ TEST_F(GifFrames, delays_are_milliseconds_and_tables_are_told) {
 }
 
 TEST_F(GifFrames, getters_give_the_words) {
-    TestSource source(PELM_SOURCE_MEMORY, three_frames().file());
-    ImageDecodeInfo info{};
-    info.input = &source.source;
-    info.outputFormat = 7;
-    Bytes output(width * height * 4);
-    EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&info, output.data(), width, height), 1);
+    Fresh fresh;
+    ImageDecodeInfo &info = fresh.info;
+    EXPECT_EQ(fresh.next(), 1);
     EXPECT_EQ(ZOTARPELMI_GetAGIFDelayTime(&info), 70u);
     EXPECT_EQ(ZOTARPELMI_GetAGIFColorTableState(&info), 0u);
     EXPECT_EQ(ZOTARPELMI_GetAGIFGlobalColorTable(&info), info.globalColorTable);
     EXPECT_EQ(ZOTARPELMI_GetAGIFLocalColorTable(&info), info.localColorTable);
-    EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&info, output.data(), width, height), 1);
+    EXPECT_EQ(fresh.next(), 1);
     EXPECT_EQ(ZOTARPELMI_GetAGIFColorTableState(&info), 1u);
     EXPECT_EQ(ZOTARPELMI_AborAGIF(&info), 1);
     free_tables(info);
@@ -132,21 +142,17 @@ TEST_F(GifFrames, iterative_calls_stop_after_every_sixteenth_cycle) {
 }
 
 TEST_F(GifFrames, after_the_last_frame_a_call_begins_again) {
-    TestSource source(PELM_SOURCE_STREAM, three_frames().file());
-    ImageDecodeInfo info{};
-    info.input = &source.source;
-    info.outputFormat = 7;
+    Fresh fresh;
     std::vector<Bytes> outputs;
-    Bytes output(width * height * 4); // of the first call of each round
     for (int round = 0; round < 3; ++round) {
-        std::fill(output.begin(), output.end(), uint8_t{9});
+        std::fill(fresh.output.begin(), fresh.output.end(), uint8_t{9});
         for (const int32_t expected : {1, 1, 3}) {
-            EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&info, output.data(), width, height), expected);
-            outputs.push_back(output);
+            EXPECT_EQ(fresh.next(), expected);
+            outputs.push_back(fresh.output);
         }
-        EXPECT_EQ(info.decoderState, nullptr);
+        EXPECT_EQ(fresh.info.decoderState, nullptr);
         EXPECT_EQ(host.live_blocks(), (std::vector<uint32_t>{1024, 1024}));
-        free_tables(info);
+        free_tables(fresh.info);
     }
     for (size_t i = 3; i < outputs.size(); ++i)
         EXPECT_EQ(outputs[i], outputs[i - 3]);
@@ -155,14 +161,11 @@ TEST_F(GifFrames, after_the_last_frame_a_call_begins_again) {
 TEST_F(GifFrames, a_local_table_that_was_taken_away_is_not_missed) {
     const auto expected = frames_of(three_frames().file(), request);
     host.reset();
-    TestSource source(PELM_SOURCE_STREAM, three_frames().file());
-    ImageDecodeInfo info{};
-    info.input = &source.source;
-    info.outputFormat = 7;
-    Bytes output(width * height * 4, gif_background);
+    Fresh fresh;
+    ImageDecodeInfo &info = fresh.info;
     for (const DeliveredFrame &frame : expected) { // the second one has a table of its own
-        EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&info, output.data(), width, height), frame.result);
-        EXPECT_EQ(output, frame.output);
+        EXPECT_EQ(fresh.next(), frame.result);
+        EXPECT_EQ(fresh.output, frame.output);
         EXPECT_EQ(info.colorTableState, frame.words.colour_table_state);
         if (info.localColorTable != nullptr) ZOTARPELM_OsFree(info.localColorTable);
         info.localColorTable = nullptr;
@@ -175,18 +178,14 @@ TEST_F(GifFrames, a_local_table_that_was_taken_away_is_not_missed) {
 TEST_F(GifFrames, the_output_arguments_of_later_calls_are_ignored) {
     const auto expected = frames_of(three_frames().file(), request);
     host.reset();
-    TestSource source(PELM_SOURCE_STREAM, three_frames().file());
-    ImageDecodeInfo info{};
-    info.input = &source.source;
-    info.outputFormat = 7;
-    Bytes output(width * height * 4, gif_background);
-    EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&info, output.data(), width, height), 1);
-    info.outputFormat = 0;
-    info.flags = PELM_ROTATE_180;
-    EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&info, nullptr, -1, 70000), 1);
-    EXPECT_EQ(output, expected[1].output);
-    EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&info, nullptr, 0, 0), 3);
-    EXPECT_EQ(output, expected[2].output);
+    Fresh fresh;
+    EXPECT_EQ(fresh.next(), 1);
+    fresh.info.outputFormat = 0;
+    fresh.info.flags = PELM_ROTATE_180;
+    EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&fresh.info, nullptr, -1, 70000), 1);
+    EXPECT_EQ(fresh.output, expected[1].output);
+    EXPECT_EQ(ZOTARPELMI_DecodeAGIF(&fresh.info, nullptr, 0, 0), 3);
+    EXPECT_EQ(fresh.output, expected[2].output);
 }
 
 TEST_F(GifFrames, giving_up_frees_all_but_the_tables) {

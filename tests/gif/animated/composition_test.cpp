@@ -1,6 +1,7 @@
 // What a frame shows and what it leaves for the next one: disposal, transparency and place, one by one with colours
 // worked out by hand, and all together against the model.
 #include "tests/gif/animated/frames.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -126,7 +127,7 @@ TEST_F(GifComposition, every_disposal_transparency_and_place_together) {
         for (uint8_t disposal = 0; disposal < 8; ++disposal)
             for (const int transparent : {-1, 0, 3}) {
                 ++seed;
-                if (quick_gif_run() && seed % 5 != 0) continue;
+                if (quick() && seed % 5 != 0) continue;
                 Animation animation{width, height, 2, static_cast<uint8_t>(seed % 5), {}, true, seed};
                 animation.frames = {{{0, 0, width, height}, {1, -1, 3}},
                                     {place, {disposal, transparent, 5}},
@@ -143,7 +144,7 @@ TEST_F(GifComposition, every_format_rotation_and_size) {
     for (const ImagePlace &place : places)
         for (const uint32_t format : {0u, 1u, 5u, 7u, 8u, 10u, 11u, 12u, 6u}) {
             const uint32_t seed = format + place.left;
-            if (quick_gif_run() && seed % 4 != 0) continue;
+            if (quick() && seed % 4 != 0) continue;
             Animation animation{width, height, 2, 2, {}, true, seed};
             animation.frames = {{{3, 2, 4, 4}, {2, 1, 3}},
                                 {place, {2, 2, 5}},

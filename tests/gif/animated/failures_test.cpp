@@ -1,6 +1,7 @@
 // Animations that end too early, hosts without memory, absurd screens.
 #include "tests/gif/animated/frames.h"
 #include "tests/gif/support/gif_blocks.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -198,7 +199,7 @@ TEST_F(GifFrameFailures, sources_and_short_reads_give_the_same_frames) {
 }
 
 TEST_F(GifFrameFailures, long_frames_that_may_be_broken_do_as_the_model) {
-    const uint32_t seeds = quick_gif_run() ? 20 : 300;
+    const uint32_t seeds = quick() ? 20 : 300;
     for (uint32_t seed = 0; seed < seeds && !HasFailure(); ++seed) {
         Noise noise(seed + 8888);
         const auto below = [&noise](uint32_t limit) { return (noise.next() >> 6) % limit; };
@@ -219,7 +220,7 @@ TEST_F(GifFrameFailures, long_frames_that_may_be_broken_do_as_the_model) {
 }
 
 TEST_F(GifFrameFailures, random_animations_do_as_the_model) {
-    const uint32_t seeds = quick_gif_run() ? 100 : 3000;
+    const uint32_t seeds = quick() ? 100 : 3000;
     for (uint32_t seed = 0; seed < seeds && !HasFailure(); ++seed) {
         Noise noise(seed + 4242);
         const auto below = [&noise](uint32_t limit) { return (noise.next() >> 6) % limit; };

@@ -4,6 +4,7 @@
 
 #include "tests/gif/animated/frames.h"
 #include "tests/gif/support/giflib_reader.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -90,7 +91,7 @@ TEST_F(GifFrameOracle, shared_animations_show_the_composed_frames) {
 }
 
 TEST_F(GifFrameOracle, own_animations_show_the_composed_frames) {
-    const uint32_t seeds = quick_gif_run() ? 40 : 500;
+    const uint32_t seeds = quick() ? 40 : 500;
     for (uint32_t seed = 0; seed < seeds && !HasFailure(); ++seed) {
         Noise noise(seed + 31);
         const auto below = [&noise](uint32_t limit) { return static_cast<uint16_t>((noise.next() >> 6) % limit); };

@@ -1,5 +1,6 @@
 // The fast loop and the careful one: the same pixels, the same end and the same place in the file, whatever the codes.
 #include "tests/gif/inner/decoding_loops.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -17,7 +18,7 @@ void expect_same_end(const GifFile &file, const GifRequest &request, const std::
 using GifLoops = GifTest;
 
 TEST_F(GifLoops, agree_on_streams_that_break_somewhere) {
-    const uint32_t seeds = quick_gif_run() ? 40 : 600;
+    const uint32_t seeds = quick() ? 40 : 600;
     for (uint32_t seed = 0; seed < seeds; ++seed) {
         Noise noise(seed + 77);
         const auto below = [&noise](uint32_t limit) { return (noise.next() >> 6) % limit; };

@@ -1,5 +1,6 @@
 // Boxes and screens of any size: the size that is worked out for them, and that nothing breaks.
 #include "tests/gif/support/gif_check.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -58,7 +59,7 @@ TEST_F(GifBoxes, small_boxes_of_all_shapes_are_filled_as_computed) {
         for (int32_t height = 0; height <= 12; ++height)
             for (uint32_t turns = 0; turns < 4; ++turns)
                 for (const uint32_t placement : placements) {
-                    if (quick_gif_run() && (width + height + static_cast<int32_t>(turns)) % 5 != 0) continue;
+                    if (quick() && (width + height + static_cast<int32_t>(turns)) % 5 != 0) continue;
                     const uint32_t format = gif_formats[(width * 5 + height) % 8];
                     EXPECT_EQ(gif_difference(file, {format, turns, placement, width, height}), "");
                 }

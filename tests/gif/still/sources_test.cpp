@@ -1,5 +1,6 @@
 // Where the bytes come from: every kind of source, short reads, failing reads, and files that end anywhere.
 #include "tests/gif/support/gif_check.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -114,7 +115,7 @@ TEST_F(GifSources, a_read_that_claims_more_than_was_asked_for_does_no_harm) {
 
 TEST_F(GifSources, a_full_buffer_whose_reads_come_full_is_used_to_its_last_byte) {
     const Bytes file = large_file();
-    for (size_t more = 0; more < 300; more += quick_gif_run() ? 37 : 1) { // moves every block across the buffer's end
+    for (size_t more = 0; more < 300; more += quick() ? 37 : 1) { // moves every block across the buffer's end
         GifFile moved;
         moved.raw({file.begin(), file.begin() + 13 + 768})
             .raw(Bytes(more, 0))
@@ -156,7 +157,7 @@ TEST_F(GifTruncation, a_turned_file_of_tiny_sub_blocks_may_end_anywhere) {
 }
 
 TEST_F(GifTruncation, a_long_file_may_end_anywhere) {
-    expect_as_modelled_at_every_byte(large_file(), {1, 0, 0, 30, 20}, quick_gif_run() ? 9973 : 997);
+    expect_as_modelled_at_every_byte(large_file(), {1, 0, 0, 30, 20}, quick() ? 9973 : 997);
 }
 
 TEST_F(GifTruncation, half_of_a_file_decodes_half_of_the_picture_and_clears_the_rest) {

@@ -1,5 +1,6 @@
 // Thousands of files and requests that look random and are the same in every run, against the model.
 #include "tests/gif/support/gif_check.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -7,7 +8,7 @@ namespace {
 constexpr GifCall stills[] = {GifCall::one_shot, GifCall::iterative, GifCall::line};
 
 uint32_t cases(uint32_t all) {
-    return quick_gif_run() ? all / 25 : all;
+    return quick() ? all / 25 : all;
 }
 
 class RandomGif {

@@ -46,11 +46,6 @@ bool gif_marks_intact(const ImageDecodeInfo &info) {
 
 } // namespace
 
-bool quick_gif_run() {
-    static const bool asked = getenv("PELM_TEST_QUICK") != nullptr;
-    return asked;
-}
-
 std::string name_of(GifCall call) {
     constexpr const char *names[] = {"one-shot", "iterative", "line", "frame", "iterative frame"};
     return names[static_cast<int>(call)];

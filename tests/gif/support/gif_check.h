@@ -19,9 +19,6 @@ inline constexpr uint32_t gif_formats[] = {0, 1, 5, 7, 8, 10, 11, 12};
 inline constexpr uint32_t gif_source_kinds[] = {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM, PELM_SOURCE_STREAM_ALT,
                                                 PELM_SOURCE_SEQUENTIAL};
 
-// True when the environment asks for fewer cases (PELM_TEST_QUICK): emulators and sanitizers.
-bool quick_gif_run();
-
 enum class GifCall { one_shot, iterative, line, frame, frame_iterative };
 std::string name_of(GifCall call);
 

@@ -3,6 +3,7 @@
 
 #include "tests/png/decode/calls_model.h"
 #include "tests/png/decode/decoding.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -59,7 +60,7 @@ Picture repetitive_picture(uint32_t width, uint32_t height) {
 
 TEST_F(PngCalls, every_way_of_calling_gives_the_same_image_from_every_source) {
     const Layout quick_layouts[] = {{rgb, 8}, {indexed, 2}};
-    const std::vector<Layout> layouts = quick_run()
+    const std::vector<Layout> layouts = quick()
                                             ? std::vector<Layout>(std::begin(quick_layouts), std::end(quick_layouts))
                                             : std::vector<Layout>(std::begin(all_layouts), std::end(all_layouts));
     for (const Layout layout : layouts) {

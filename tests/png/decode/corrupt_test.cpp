@@ -1,5 +1,6 @@
 // Files that are cut or wrong: what is written of them and what is answered.
 #include "tests/png/decode/decoding.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -33,7 +34,7 @@ TEST_F(PngCorrupt, files_cut_anywhere_fail_from_every_source) {
             const Bytes file = build(png);
             const Request request = own_size(picture);
             const size_t size = buffer_size(picture, request);
-            const size_t step = quick_run() ? 3 : 1;
+            const size_t step = quick() ? 3 : 1;
             for (size_t length = 0; length < file.size(); length += step)
                 for (const uint32_t kind : {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM, PELM_SOURCE_SEQUENTIAL})
                     for (const Call call : {Call::one_shot, Call::iterative}) {
@@ -67,7 +68,7 @@ TEST_F(PngCorrupt, image_data_cut_anywhere_is_read_to_the_end_of_the_file_and_no
         const Bytes stream = stream_of_blocks(scanlines_of(png), compressed, 120, 37);
         const Request request = own_size(picture);
         const size_t size = buffer_size(picture, request);
-        const size_t step = quick_run() ? 3 : 1;
+        const size_t step = quick() ? 3 : 1;
         for (size_t length = 1; length <= stream.size(); length += step)
             for (const size_t split : {0u, 50u}) {
                 png.stream = Bytes(stream.begin(), stream.begin() + static_cast<ptrdiff_t>(length));
@@ -271,7 +272,7 @@ TEST_F(PngCorrupt, a_single_flipped_bit_in_any_chunk_fails) {
     const Bytes file = build(png);
     const Request request = own_size(picture);
     const size_t size = buffer_size(picture, request);
-    for (size_t at = 0; at < file.size(); at += quick_run() ? 5 : 1)
+    for (size_t at = 0; at < file.size(); at += quick() ? 5 : 1)
         for (int bit = 0; bit < 8; ++bit) {
             Bytes bad = file;
             bad[at] = static_cast<uint8_t>(bad[at] ^ 1 << bit);

@@ -6,10 +6,6 @@
 
 namespace pelm::test {
 
-bool quick_run() {
-    return getenv("PELM_TEST_QUICK") != nullptr;
-}
-
 std::string name_of(Blocks blocks) {
     constexpr const char *names[] = {"stored", "fixed", "dynamic", "mixed"};
     return names[static_cast<int>(blocks)];

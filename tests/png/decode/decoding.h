@@ -13,9 +13,6 @@
 
 namespace pelm::test {
 
-// True when the environment asks for fewer cases (PELM_TEST_QUICK): emulators and sanitizers.
-bool quick_run();
-
 inline constexpr uint32_t all_source_kinds[] = {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM, PELM_SOURCE_STREAM_ALT,
                                                 PELM_SOURCE_SEQUENTIAL};
 

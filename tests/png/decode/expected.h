@@ -17,6 +17,10 @@ struct Request {
     std::string described() const;
 };
 
+inline bool asks_for_frame(const Request &request) {
+    return (request.flags & 0x3000) == 0x1000;
+}
+
 inline constexpr uint32_t written_formats[] = {0, 1, 5, 6, 7, 8};
 
 size_t pixel_size(uint32_t format);

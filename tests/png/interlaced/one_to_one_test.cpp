@@ -1,5 +1,6 @@
 // Interlaced pictures at their own size: every pixel at its place, whatever was asked for.
 #include "tests/png/interlaced/passes.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -7,7 +8,7 @@ namespace {
 using PngInterlaced = PngDecoding;
 
 std::vector<uint32_t> sides() {
-    if (quick_run()) return {1, 2, 3, 5, 8, 9, 16};
+    if (quick()) return {1, 2, 3, 5, 8, 9, 16};
     return {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16, 17};
 }
 

@@ -19,10 +19,6 @@ struct PassRow {
 
 std::vector<PassRow> pass_rows_of(const Picture &picture);
 
-inline bool asks_for_frame(const Request &request) {
-    return (request.flags & 0x3000) == 0x1000;
-}
-
 // What the pass rows from `first` to before `end` write when they arrive.
 void draw_pass_rows(const Picture &picture, const Request &request, size_t first, size_t end, Bytes &bytes);
 // What the frame writes when the image is complete; nothing for requests without a frame, or at the image's own size.
