@@ -147,28 +147,6 @@ inline Bytes16 last_everywhere(Bytes16 bytes) {
     }
 }
 
-// The first `unit` bytes (1, 2, 3, 4, 6 or 8) over and over.
-template <uint32_t unit>
-inline Bytes16 first_everywhere(Bytes16 bytes) {
-    if constexpr (16 % unit == 0) {
-        return last_everywhere<unit>(move_up<16 - unit>(bytes));
-    } else {
-        Bytes16 pixels = move_down<16 - unit>(move_up<16 - unit>(bytes));
-        pixels |= move_up<unit>(pixels);
-        if constexpr (unit == 3) pixels |= move_up<6>(pixels);
-        return pixels | move_up<12>(pixels);
-    }
-}
-
-inline bool is_zero(Bytes16 bytes) {
-#if defined(__SSE2__)
-    return _mm_movemask_epi8(_mm_cmpeq_epi8(std::bit_cast<__m128i>(bytes), _mm_setzero_si128())) == 0xFFFF;
-#else
-    const auto words = std::bit_cast<Words2>(bytes);
-    return (words[0] | words[1]) == 0;
-#endif
-}
-
 // Words of `unit` bytes (1, 2, 4 or 8) of the two first halves in turn.
 template <uint32_t unit, class Vector>
 inline Vector join_words(Vector a, Vector b) {

@@ -4,10 +4,8 @@
 
 #include <algorithm>
 #include <cstddef>
-
-#include "frame/lanes.h"
-
-#ifdef PELM_HAS_LANES
+#include <cstdint>
+#include <cstring>
 
 namespace pelm {
 
@@ -19,13 +17,12 @@ struct PaethRuns {
     // Undoes the run if this is such a place.
     static bool undo(uint8_t *row, const uint8_t *above) {
         if (!is_zero(row)) return false;
-        const Bytes16 left = load_bytes<unit>(row - unit);
-        if (pelm::is_zero(left ^ load_bytes<unit>(above - unit))) {
-            copy(row, above);
-            return true;
-        }
-        if (!repeats_left(above)) return false;
-        fill(row, left);
+        if (std::memcmp(row - unit, above - unit, unit) == 0)
+            std::memcpy(row, above, length);
+        else if (repeats_left(above))
+            repeat_left(row);
+        else
+            return false;
         return true;
     }
 
@@ -41,39 +38,53 @@ struct PaethRuns {
     }
 
 private:
-    static constexpr uint32_t rest = length % 16; // bytes behind the whole vectors
+    static uint64_t eight_bytes(const uint8_t *from) {
+        uint64_t bytes;
+        std::memcpy(&bytes, from, sizeof bytes);
+        return bytes;
+    }
 
     static bool is_zero(const uint8_t *row) {
-        Bytes16 any{};
-        for (uint32_t i = 0; i + 16 <= length; i += 16)
-            any |= load_bytes<16>(row + i);
-        if constexpr (rest != 0) any |= load_bytes<rest>(row + length - rest);
-        return pelm::is_zero(any);
+        uint64_t any = 0;
+        for (uint32_t i = 0; i < length; i += 8)
+            any |= eight_bytes(row + i);
+        return any == 0;
     }
 
     static bool repeats_left(const uint8_t *above) {
-        Bytes16 differences{};
-        for (uint32_t i = 0; i + 16 <= length; i += 16)
-            differences |= load_bytes<16>(above + i) ^ load_bytes<16>(above + i - unit);
-        if constexpr (rest != 0) {
-            const uint8_t *const last = above + length - rest;
-            differences |= load_bytes<rest>(last) ^ load_bytes<rest>(last - unit);
-        }
-        return pelm::is_zero(differences);
+        uint64_t differences = 0;
+        for (uint32_t i = 0; i < length; i += 8)
+            differences |= eight_bytes(above + i) ^ eight_bytes(above + i - unit);
+        return differences == 0;
     }
 
-    static void copy(uint8_t *row, const uint8_t *above) { std::memcpy(row, above, length); }
-
-    // `left` in its first bytes.
-    static void fill(uint8_t *row, Bytes16 left) {
-        constexpr uint32_t period = 16 / unit * unit, whole = (length - 16) / period * period + period;
-        const Bytes16 pixels = first_everywhere<unit>(left);
-        for (uint32_t i = 0; i < whole; i += period)
-            store_bytes<16>(row + i, pixels);
-        if constexpr (whole < length) store_bytes<length - whole>(row + whole, pixels);
+    static void repeat_left(uint8_t *row) {
+        uint8_t left[unit];
+        std::memcpy(left, row - unit, unit);
+        for (uint32_t i = 0; i < length; i += unit)
+            std::memcpy(row + i, left, unit);
     }
 };
 
-} // namespace pelm
+// Undoes Paeth for a row, by runs where they are common. A chain goes from pixel to pixel: undo(row, above, length)
+// goes on for so many bytes, as far as it can, and returns how many are done; go_on_at(row, above) puts it between two
+// pixels, of which the left one is reconstructed. Returns how many bytes are done.
+template <uint32_t unit, class Chain>
+inline uint32_t undo_paeth_by_runs(Chain &chain, uint8_t *row, const uint8_t *above, uint32_t length) {
+    using Runs = PaethRuns<unit>;
+    if (!Runs::are_common(row, length)) return chain.undo(row, above, length);
+    uint32_t i = chain.undo(row, above, Runs::length); // which has no pixel on its left
+    for (bool is_behind = false; length - i >= Runs::length; i += Runs::length) {
+        if (Runs::undo(row + i, above + i)) {
+            is_behind = true;
+            continue;
+        }
+        if (is_behind) chain.go_on_at(row + i, above + i);
+        is_behind = false;
+        chain.undo(row + i, above + i, Runs::length);
+    }
+    chain.go_on_at(row + i, above + i);
+    return i + chain.undo(row + i, above + i, length - i);
+}
 
-#endif
+} // namespace pelm

@@ -14,5 +14,7 @@ void __PELMI_PngReadFilterRow(const PngDecodeState *state, uint8_t *row, const u
     const bool has_lanes = (distance <= 4 || distance == 6 || distance == 8) && filter <= FILTER_PAETH;
     if (lanes_are_fast && has_lanes && kernels() >= Kernels::lanes)
         return unfilter_lanes(filter, row, previousRow, rowLength, distance);
+    if (filter == FILTER_PAETH && kernels() >= Kernels::plain)
+        return unfilter_paeth_by_runs(row, previousRow, rowLength, distance);
     unfilter_plain(filter, row, previousRow, rowLength, distance);
 }

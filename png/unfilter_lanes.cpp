@@ -212,21 +212,8 @@ struct LargePaethChain {
 
 template <uint32_t unit, class Chain>
 uint32_t undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length) {
-    using Runs = PaethRuns<unit>;
     Chain chain;
-    if (!Runs::are_common(row, length)) return chain.undo(row, above, length);
-    uint32_t i = chain.undo(row, above, Runs::length); // which has no pixel on its left
-    for (bool is_behind = false; length - i >= Runs::length; i += Runs::length) {
-        if (Runs::undo(row + i, above + i)) {
-            is_behind = true;
-            continue;
-        }
-        if (is_behind) chain.go_on_at(row + i, above + i);
-        is_behind = false;
-        chain.undo(row + i, above + i, Runs::length);
-    }
-    chain.go_on_at(row + i, above + i);
-    return i + chain.undo(row + i, above + i, length - i);
+    return undo_paeth_by_runs<unit>(chain, row, above, length);
 }
 
 template <uint32_t unit>

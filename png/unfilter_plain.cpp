@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <type_traits>
 
+#include "png/paeth_runs.h"
+
 namespace pelm {
 namespace {
 
@@ -61,18 +63,39 @@ void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length, D distance)
 
 // Whole pixels, whose left neighbours stay in registers.
 template <uint32_t distance>
-void undo_paeth(uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length, Distance<distance>) {
-    int32_t left[distance] = {};
-    int32_t above_left[distance] = {};
-    uint32_t i = 0;
-    for (; i + distance <= length; i += distance)
-        for (uint32_t k = 0; k < distance; ++k) {
-            const int32_t up = above[i + k];
-            left[k] = static_cast<uint8_t>(row[i + k] + paeth_predictor(left[k], up, above_left[k]));
-            above_left[k] = up;
-            row[i + k] = static_cast<uint8_t>(left[k]);
-        }
-    undo_paeth_from(i, row, above, length, Distance<distance>());
+struct PlainPaethChain {
+    int32_t left[distance] = {}, above_left[distance] = {};
+
+    uint32_t undo(uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length) {
+        uint32_t i = 0;
+        for (; i + distance <= length; i += distance)
+            for (uint32_t k = 0; k < distance; ++k) {
+                const int32_t up = above[i + k];
+                left[k] = static_cast<uint8_t>(row[i + k] + paeth_predictor(left[k], up, above_left[k]));
+                above_left[k] = up;
+                row[i + k] = static_cast<uint8_t>(left[k]);
+            }
+        return i;
+    }
+
+    void go_on_at(const uint8_t *row, const uint8_t *above) {
+        std::copy_n(row - distance, distance, left);
+        std::copy_n(above - distance, distance, above_left);
+    }
+};
+
+template <uint32_t distance>
+void undo_paeth(uint8_t *row, const uint8_t *above, uint32_t length, Distance<distance>) {
+    PlainPaethChain<distance> chain;
+    const uint32_t done = chain.undo(row, above, length);
+    undo_paeth_from(done, row, above, length, Distance<distance>());
+}
+
+template <uint32_t distance>
+void undo_paeth_with_runs(uint8_t *row, const uint8_t *above, uint32_t length) {
+    PlainPaethChain<distance> chain;
+    const uint32_t done = undo_paeth_by_runs<distance>(chain, row, above, length);
+    undo_paeth_from(done, row, above, length, Distance<distance>());
 }
 
 template <class D>
@@ -100,6 +123,18 @@ void unfilter_plain_from(uint32_t done, uint8_t filter, uint8_t *row, const uint
     case FILTER_AVERAGE: return undo_average_from(done, row, above, length, distance);
     case FILTER_PAETH: return undo_paeth_from(done, row, above, length, distance);
     default: return;
+    }
+}
+
+void unfilter_paeth_by_runs(uint8_t *row, const uint8_t *above, uint32_t length, uint32_t distance) {
+    switch (distance) {
+    case 1: return undo_paeth_with_runs<1>(row, above, length);
+    case 2: return undo_paeth_with_runs<2>(row, above, length);
+    case 3: return undo_paeth_with_runs<3>(row, above, length);
+    case 4: return undo_paeth_with_runs<4>(row, above, length);
+    case 6: return undo_paeth_with_runs<6>(row, above, length);
+    case 8: return undo_paeth_with_runs<8>(row, above, length);
+    default: return undo_paeth_from(0, row, above, length, distance);
     }
 }
 
