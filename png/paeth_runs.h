@@ -67,23 +67,16 @@ private:
 };
 
 // Undoes Paeth for a row, by runs where they are common. A chain goes from pixel to pixel: undo(row, above, length)
-// goes on for so many bytes, as far as it can, and returns how many are done; go_on_at(row, above) puts it between two
-// pixels, of which the left one is reconstructed. Returns how many bytes are done.
+// goes on for so many bytes, as far as it can, and returns how many are done. It need not hear of the runs between:
+// where the pixel on the left is like the one above that, whichever the two are, it finds the one above; and a run of
+// one pixel leaves them as they are. Returns how many bytes are done.
 template <uint32_t unit, class Chain>
 inline uint32_t undo_paeth_by_runs(Chain &chain, uint8_t *row, const uint8_t *above, uint32_t length) {
     using Runs = PaethRuns<unit>;
     if (!Runs::are_common(row, length)) return chain.undo(row, above, length);
     uint32_t i = chain.undo(row, above, Runs::length); // which has no pixel on its left
-    for (bool is_behind = false; length - i >= Runs::length; i += Runs::length) {
-        if (Runs::undo(row + i, above + i)) {
-            is_behind = true;
-            continue;
-        }
-        if (is_behind) chain.go_on_at(row + i, above + i);
-        is_behind = false;
-        chain.undo(row + i, above + i, Runs::length);
-    }
-    chain.go_on_at(row + i, above + i);
+    for (; length - i >= Runs::length; i += Runs::length)
+        if (!Runs::undo(row + i, above + i)) chain.undo(row + i, above + i, Runs::length);
     return i + chain.undo(row + i, above + i, length - i);
 }
 

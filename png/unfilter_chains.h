@@ -41,13 +41,6 @@ struct PaethLanes {
 struct PaethChain {
     PaethLanes lanes;
 
-    // Behind a pixel and the one above it.
-    void go_on(Bytes16 left, Bytes16 up_left) {
-        lanes.left = widen(left);
-        lanes.up_left = widen(up_left);
-        lanes.three_up_left = lanes.up_left + lanes.up_left + lanes.up_left;
-    }
-
     Bytes16 next(Bytes16 residual, Bytes16 up) { return narrow(lanes.next(widen(residual), widen(up))); }
 };
 

@@ -188,13 +188,6 @@ struct SmallPaethChain {
         }
         return i;
     }
-
-    // The next pixel is the one at `row`, below that at `above`.
-    void go_on_at(const uint8_t *row, const uint8_t *above) {
-        for (uint32_t k = 0; k < unit; ++k)
-            left.channels[k] = *(row - unit + k);
-        last_up = load_bytes<unit>(above - unit);
-    }
 };
 
 template <uint32_t unit>
@@ -203,10 +196,6 @@ struct LargePaethChain {
 
     uint32_t undo(uint8_t *row, const uint8_t *above, uint32_t length) {
         return undo_by_pixels<unit>(chain, row, above, length);
-    }
-
-    void go_on_at(const uint8_t *row, const uint8_t *above) {
-        chain.go_on(load_bytes<unit>(row - unit), load_bytes<unit>(above - unit));
     }
 };
 

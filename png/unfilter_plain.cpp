@@ -77,11 +77,6 @@ struct PlainPaethChain {
             }
         return i;
     }
-
-    void go_on_at(const uint8_t *row, const uint8_t *above) {
-        std::copy_n(row - distance, distance, left);
-        std::copy_n(above - distance, distance, above_left);
-    }
 };
 
 template <uint32_t distance>
