@@ -38,12 +38,13 @@ bool has_exact_buffers(const Plan &plan) {
     return knows_exact_buffers(plan.format) && (plan.flags & PELM_PLACE_MASK) == PELM_PLACE_EXACT;
 }
 
-// On 32 bits large images turned in an exact buffer may begin too far outside it (docs/formats.md, "Box"); without a
-// buffer that is nothing.
-bool may_begin_too_far(const Outcome &measured) {
-    return sizeof(void *) == 4 && std::any_of(measured.scaled.begin(), measured.scaled.end(), [](Sides scaled) {
-               return std::max(scaled.width, scaled.height) > 20000;
-           });
+// On 32 bits large images turned sideways in an exact buffer may begin too far outside it (docs/formats.md, "Box");
+// without a buffer that is nothing.
+bool may_begin_too_far(const Plan &plan, const Outcome &measured) {
+    const bool sideways = (plan.flags & PELM_ROTATE_90) != 0; // 270 has that bit, too
+    return sizeof(void *) == 4 && sideways &&
+           std::any_of(measured.scaled.begin(), measured.scaled.end(),
+                       [](Sides scaled) { return std::max(scaled.width, scaled.height) > 20000; });
 }
 
 uint64_t pixels_of(Sides sides) {
@@ -272,7 +273,7 @@ Report carry_out(const Plan &plan) {
     Session session(plan, filling, true, &measured);
     report.outcome = session.run();
     report.calls = measured.results.size() + report.outcome.results.size();
-    if (exact && report.outcome.results != measured.results && !may_begin_too_far(measured))
+    if (exact && report.outcome.results != measured.results && !may_begin_too_far(plan, measured))
         give_reason("other results without a buffer");
     if (plan.again) {
         report.again = session.run_again();

@@ -1,5 +1,4 @@
 // The tool tells why a BMP is refused by rules of its own; they must be those of the decoder.
-#include "tests/support/quick.h"
 #include "tools/bmp_description.h"
 
 #include <algorithm>
@@ -7,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include "tests/support/bmp_check.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {

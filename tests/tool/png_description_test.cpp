@@ -1,10 +1,10 @@
 // The tool tells why a PNG is refused by rules of its own; they must be those of the decoder.
-#include "tests/support/quick.h"
 #include "tools/png_description.h"
 
 #include <gtest/gtest.h>
 
 #include "tests/support/bmp_check.h"
+#include "tests/support/quick.h"
 #include "tests/tool/png_file.h"
 
 namespace pelm::test {

@@ -1,5 +1,4 @@
 // The tool recognises WBMPs, and tells why one is refused, by rules of its own; they must be those of the decoder.
-#include "tests/support/quick.h"
 #include "tools/wbmp_description.h"
 
 #include <algorithm>
@@ -7,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include "tests/support/bmp_check.h"
+#include "tests/support/quick.h"
 #include "tests/support/wbmp_builder.h"
 #include "tools/failure.h"
 #include "tools/image_formats.h"
