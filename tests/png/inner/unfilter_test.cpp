@@ -110,10 +110,14 @@ TEST(Unfilter, every_filter_at_every_distance_and_length_equals_the_plain_defini
 // Those that PNG does not have, too.
 TEST(Unfilter, every_other_distance_equals_the_plain_definition) {
     Rows at_start(Edge::start), at_end(Edge::end);
-    for (const uint8_t distance : std::initializer_list<uint8_t>{5, 7, 9, 100, 255})
-        for (uint8_t filter = 0; filter <= 4; ++filter)
-            for (size_t length = 0; length <= 40; ++length)
-                ASSERT_NO_FATAL_FAILURE(compare_with_definition(length, distance, filter, at_start, at_end));
+    for (const Kernels kind : all_kernels()) {
+        const WithKernels with(kind);
+        SCOPED_TRACE(static_cast<int>(kind));
+        for (const uint8_t distance : std::initializer_list<uint8_t>{5, 7, 9, 100, 255})
+            for (uint8_t filter = 0; filter <= 4; ++filter)
+                for (size_t length = 0; length <= 40; ++length)
+                    ASSERT_NO_FATAL_FAILURE(compare_with_definition(length, distance, filter, at_start, at_end));
+    }
 }
 
 // Pictures with flat places: stretches of one pixel over and over, as residuals zeros, and here and there a byte that
