@@ -63,6 +63,7 @@ void count_png() {
     const Bytes interlaced = png(Motif::photo, {2, 8, true});
     count_still("PNG photo Adam7", interlaced, {call, rgba, size});
     count_still("PNG photo Adam7, reduced", interlaced, {call, rgb565, small, PELM_INTERLACE_FRAME});
+    count_still("PNG photo RGB, small blocks", png(Motif::photo, {2, 8, false, true}), {call, rgba, size});
     count_still("PNG illustration RGB", png(Motif::illustration, {2, 8}), {call, rgba, size});
     count_still("PNG screenshot RGBA", png(Motif::screenshot, {6, 8}), {call, rgba, size});
     count_still("PNG text grey", png(Motif::text, {0, 8}), {call, rgba, size});

@@ -35,6 +35,7 @@ void write_palette(png_structp png, png_infop info, int depth) {
 bool run(png_structp png, png_infop info, Job &job) {
     if (setjmp(png_jmpbuf(png))) return false;
     png_set_write_fn(png, &job, on_write, on_flush);
+    if (job.layout.small_blocks) png_set_compression_mem_level(png, 1);
     png_set_IHDR(png, info, job.width, job.height, job.layout.depth, job.layout.colour_type,
                  job.layout.interlaced ? PNG_INTERLACE_ADAM7 : PNG_INTERLACE_NONE, PNG_COMPRESSION_TYPE_DEFAULT,
                  PNG_FILTER_TYPE_DEFAULT);

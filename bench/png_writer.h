@@ -11,6 +11,7 @@ struct PngLayout {
     int colour_type; // as PNG counts them
     int depth;
     bool interlaced = false;
+    bool small_blocks = false; // codes of their own for every hundred symbols or so
 
     bool has_colour() const { return (colour_type & 2) != 0; }
     bool has_alpha() const { return (colour_type & 4) != 0; }

@@ -2,9 +2,9 @@
 // Adam7 passes; one core (png/inflate/inflate.h) does the work.
 //
 // `total` receives the number of bytes inflated when the image is complete. `area` is the byte offset of the placed
-// image's first pixel in the buffer of the current call. Results are internal codes: after PNG_DONE, PNG_ENDED_EARLY
-// and a stop by the host the state is gone, after PNG_ROWS_REMAIN it waits for the next call, and after everything else
-// it is the caller's to destroy.
+// image's first pixel in the buffer of the current call. Results are internal codes. Where `decoderState`
+// is NULL afterwards the state is gone; after PNG_ROWS_REMAIN it waits for the next call, and after everything else it
+// is the caller's to destroy.
 #pragma once
 
 #include "png/state.h"

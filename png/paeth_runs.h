@@ -1,5 +1,6 @@
-// Where a run of Paeth's residuals is zero, mostly no predictor has to be found: below the pixel that is like the one
-// above it the run is like the one above it; and below a run of one pixel it is the pixel on its left over and over.
+// Where a run of Paeth's residuals is zero, mostly no predictor has to be found. Where the pixel on its left is like
+// the one above that, the run is like what is above it; and where that and all that is above the run is one pixel over
+// and over, the run is the pixel on its left over and over.
 #pragma once
 
 #include <algorithm>
@@ -12,7 +13,8 @@ namespace pelm {
 // One run at a time: `row` holds its residuals, with the reconstructed pixel on their left, and `above` what is above.
 template <uint32_t unit>
 struct PaethRuns {
-    static constexpr uint32_t length = unit <= 2 ? 16 : unit % 3 == 0 ? 24 : 32; // bytes of one run: whole pixels
+    static constexpr uint32_t length = unit <= 2 ? 16 : unit % 3 == 0 ? 24 : 32; // bytes of one run
+    static_assert(length % unit == 0 && length % 8 == 0); // whole pixels, and what chains undo to the end
 
     // Undoes the run if this is such a place.
     static bool undo(uint8_t *row, const uint8_t *above) {
@@ -28,7 +30,7 @@ struct PaethRuns {
 
     // Whether so many runs of a row of residuals are zero that looking for them pays: a few of them tell.
     static bool are_common(const uint8_t *row, uint32_t row_length) {
-        if (row_length < 5 * length) return false;
+        if (row_length < 5 * length) return false; // too few to tell
         const uint32_t runs = row_length / length;
         const uint32_t probes = std::min(runs, 16u);
         uint32_t zero = 0;
@@ -67,9 +69,10 @@ private:
 };
 
 // Undoes Paeth for a row, by runs where they are common. A chain goes from pixel to pixel: undo(row, above, length)
-// goes on for so many bytes, as far as it can, and returns how many are done. It need not hear of the runs between:
-// where the pixel on the left is like the one above that, whichever the two are, it finds the one above; and a run of
-// one pixel leaves them as they are. Returns how many bytes are done.
+// goes on for so many bytes, as far as it can, and returns how many are done. It need not hear of the runs between,
+// but may keep the left pixel, and the one above that, from before them: behind a copied run both pairs are alike, and
+// then the pixel above is what is predicted, whatever they are; behind a repeated pixel they are the same. Returns how
+// many bytes are done.
 template <uint32_t unit, class Chain>
 inline uint32_t undo_paeth_by_runs(Chain &chain, uint8_t *row, const uint8_t *above, uint32_t length) {
     using Runs = PaethRuns<unit>;

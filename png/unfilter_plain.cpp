@@ -68,7 +68,7 @@ struct PlainPaethChain {
 
     uint32_t undo(uint8_t *__restrict row, const uint8_t *__restrict above, uint32_t length) {
         uint32_t i = 0;
-        for (; i + distance <= length; i += distance)
+        for (; length - i >= distance; i += distance)
             for (uint32_t k = 0; k < distance; ++k) {
                 const int32_t up = above[i + k];
                 left[k] = static_cast<uint8_t>(row[i + k] + paeth_predictor(left[k], up, above_left[k]));

@@ -1,5 +1,5 @@
-// Undoing filters byte by byte: the definition that the other code is held against, and the one for processors without
-// vectors, for odd pixel sizes and for what is left of a row.
+// Undoing filters byte by byte: the definition that the other code is held against, and what processors without vectors
+// use (but for Paeth), odd pixel sizes, and what is left of a row.
 #pragma once
 
 #include <cstdint>

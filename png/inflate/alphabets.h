@@ -5,6 +5,9 @@
 
 namespace pelm {
 
+constexpr uint32_t longest_code = 15; // bits
+constexpr uint32_t largest_alphabet = 288;
+
 // RFC 1951, section 3.2.5. Symbols that stand for a base; extra bits are stored as the leaf's `op`.
 constexpr uint32_t base_symbols = 32;
 

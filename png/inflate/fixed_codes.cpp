@@ -41,12 +41,12 @@ constexpr LookupTables make_tables() {
 }
 
 // Lengths of the codes of all symbols; distances 30 and 31 are no symbols.
-struct CodeLengths {
+struct FixedLengths {
     uint8_t literals[288], distances[30];
 };
 
-constexpr CodeLengths make_code_lengths() {
-    CodeLengths lengths{};
+constexpr FixedLengths make_code_lengths() {
+    FixedLengths lengths{};
     for (uint32_t symbol = 0; symbol < 288; ++symbol)
         lengths.literals[symbol] = symbol < 144 || symbol >= 280 ? 8 : symbol < 256 ? 9 : 7;
     for (uint8_t &length : lengths.distances)
@@ -59,7 +59,7 @@ struct Entries {
 };
 
 constexpr Entries make_entries() {
-    constexpr CodeLengths lengths = make_code_lengths();
+    constexpr FixedLengths lengths = make_code_lengths();
     Entries entries{};
     make_table<HUFFMAN_LITERAL_LENGTH>(lengths.literals, 288, 9, 1 << 9, entries.literals);
     make_table<HUFFMAN_DISTANCE>(lengths.distances, 30, 5, 1 << 5, entries.distances);

@@ -5,13 +5,11 @@
 
 #include "frame/memory.h"
 #include "png/inflate/alphabets.h"
+#include "png/inflate/coded_symbols.h"
 
 namespace {
 
 using namespace pelm;
-
-constexpr uint32_t longest_code = 15;
-constexpr uint32_t largest_alphabet = 288;
 
 // Codes are handed out by length, shorter ones first (RFC 1951, section 3.2.2); here also the symbols, sorted the same
 // way.
@@ -24,15 +22,10 @@ struct Codes {
 
 void assign_codes(const uint8_t *code_lengths, uint32_t count, Codes &codes) {
     std::fill_n(codes.of_length, longest_code + 1, 0u);
-    uint16_t used[largest_alphabet]; // small blocks use few symbols
-    uint32_t used_count = 0;
-    for (uint32_t symbol = 0; symbol < count; ++symbol) {
-        used[used_count] = static_cast<uint16_t>(symbol);
-        used_count += code_lengths[symbol] != 0 ? 1 : 0;
-    }
-    for (uint32_t i = 0; i < used_count; ++i)
-        ++codes.of_length[code_lengths[used[i]] & 15];
-    codes.of_length[0] = 0;
+    uint16_t coded[largest_alphabet + 1];
+    const uint32_t coded_count = list_coded_symbols(code_lengths, count, coded);
+    for (uint32_t i = 0; i < coded_count; ++i)
+        ++codes.of_length[code_lengths[coded[i]]];
     codes.first[0] = 0;
     codes.begin[1] = 0;
     uint32_t next[longest_code + 1];
@@ -41,8 +34,8 @@ void assign_codes(const uint8_t *code_lengths, uint32_t count, Codes &codes) {
         next[bits] = codes.begin[bits];
         codes.begin[bits + 1] = codes.begin[bits] + codes.of_length[bits];
     }
-    for (uint32_t i = 0; i < used_count; ++i)
-        codes.symbols[next[code_lengths[used[i]] & 15]++] = used[i];
+    for (uint32_t i = 0; i < coded_count; ++i)
+        codes.symbols[next[code_lengths[coded[i]]]++] = coded[i];
 }
 
 uint32_t new_node(HuffmanNodePool &pool) {

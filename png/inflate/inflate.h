@@ -147,14 +147,11 @@ template <class Input>
 Stop take_symbols(InflateState &now, Input &input) {
     BitReader bits = now.bits;
     Stop stop = Stop::go_on;
+    // The first symbol by itself: where it is the block's end, the fast loop would cost more.
     while (stop == Stop::go_on && !is_full(now.window)) {
-        const bool ended = now.literals.entries != nullptr &&
-                           run_fast(now.literals, now.distances, bits, input.next, input.end, now.window);
-        if (ended) {
-            stop = end_block(now);
-            break;
-        }
-        if (!is_full(now.window)) stop = take_symbol(now, bits, input);
+        stop = take_symbol(now, bits, input);
+        if (stop != Stop::go_on || now.literals.entries == nullptr) continue;
+        if (run_fast(now.literals, now.distances, bits, input.next, input.end, now.window)) stop = end_block(now);
     }
     now.bits = bits;
     return stop;

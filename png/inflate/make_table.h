@@ -4,18 +4,16 @@
 #include <array>
 
 #include "png/inflate/alphabets.h"
+#include "png/inflate/coded_symbols.h"
 #include "png/inflate/decoding_table.h"
 
 namespace pelm {
-
-constexpr uint32_t longest_code = 15;
-constexpr uint32_t largest_alphabet = 288;
 
 // Symbols in the order of their codes, shorter ones first (RFC 1951, section 3.2.2), and the codes as they come in the
 // stream: first bit lowest.
 struct SortedCodes {
     uint32_t begin[longest_code + 2]; // of the symbols of each length; behind the last one, all of them
-    uint16_t symbols[largest_alphabet + 1];
+    uint16_t symbols[largest_alphabet];
     uint16_t codes[largest_alphabet];
     uint32_t longest; // 0: there are no codes
     bool complete;    // every string of bits begins with a code
@@ -35,7 +33,7 @@ constexpr uint16_t reversed_code(uint32_t code, uint32_t length) {
     return static_cast<uint16_t>(word >> (16 - length));
 }
 
-// The alphabet is sorted in parts side by side: within one, each symbol waits for the counters of the one before it.
+// The symbols are sorted in parts side by side: within one, each waits for the counters of the one before it.
 constexpr uint32_t sorted_parts = 4;
 
 struct LengthCounters {
@@ -44,17 +42,20 @@ struct LengthCounters {
 
 // visit(counters of the part, symbol), each part's symbols in order.
 template <class Visit>
-constexpr void visit_parts(uint32_t count, LengthCounters &counters, Visit &&visit) {
+constexpr void visit_parts(const uint16_t *symbols, uint32_t count, LengthCounters &counters, Visit &&visit) {
     const uint32_t part = (count + sorted_parts - 1) / sorted_parts;
     for (uint32_t i = 0; i < part; ++i)
         for (uint32_t k = 0; k < sorted_parts; ++k)
-            if (k * part + i < count) visit(counters.of[k], k * part + i);
+            if (k * part + i < count) visit(counters.of[k], symbols[k * part + i]);
 }
 
 // False when there are more codes than fit their lengths.
 constexpr bool sort_codes(const uint8_t *code_lengths, uint32_t count, SortedCodes &sorted) {
+    uint16_t coded[largest_alphabet + 1];
+    const uint32_t coded_count = list_coded_symbols(code_lengths, count, coded);
     LengthCounters counters{};
-    visit_parts(count, counters, [&](uint32_t *of_length, uint32_t symbol) { ++of_length[code_lengths[symbol]]; });
+    visit_parts(coded, coded_count, counters,
+                [&](uint32_t *of_length, uint32_t symbol) { ++of_length[code_lengths[symbol]]; });
     int32_t left = 1; // codes of the length that are not taken
     sorted.begin[0] = sorted.begin[1] = 0;
     sorted.longest = 0;
@@ -71,13 +72,8 @@ constexpr bool sort_codes(const uint8_t *code_lengths, uint32_t count, SortedCod
         if (next != sorted.begin[length]) sorted.longest = length;
     }
     sorted.complete = left == 0;
-    // Symbols without a code all go where nobody looks.
-    for (uint32_t k = 0; k < sorted_parts; ++k)
-        counters.of[k][0] = sorted.begin[longest_code + 1];
-    visit_parts(count, counters, [&](uint32_t *next, uint32_t symbol) {
-        const uint32_t length = code_lengths[symbol];
-        sorted.symbols[next[length]] = static_cast<uint16_t>(symbol);
-        next[length] += length != 0 ? 1 : 0;
+    visit_parts(coded, coded_count, counters, [&](uint32_t *next, uint32_t symbol) {
+        sorted.symbols[next[code_lengths[symbol]]++] = static_cast<uint16_t>(symbol);
     });
     uint32_t code = 0;
     for (uint32_t length = 1; length <= sorted.longest; ++length, code <<= 1)

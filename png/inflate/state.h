@@ -57,6 +57,7 @@ struct InflateState {
     const LookupTables *codes;         // for what these do not say; NULL until the trees are grown
     const HuffmanNode *nodes;          // what the codes' longer ones go on in
     BlockCodes *dynamic;               // owned; NULL until the first compressed block
+    uint32_t dynamic_begin;            // window.total where the latest dynamic block began, if there was one
     HuffmanNodePool *pool;             // for its trees
 };
 

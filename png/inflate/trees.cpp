@@ -22,10 +22,20 @@ bool are_equal(const CodeLengths &a, const CodeLengths &b) {
            std::memcmp(a.lengths, b.lengths, a.literals + a.distances) == 0;
 }
 
-void make_tables(BlockCodes &codes) {
+struct Widths {
+    uint32_t literals, distances;
+};
+
+constexpr Widths widest = {widest_literal_table, widest_distance_table};
+
+// Wide tables take longer to make than a small block takes to decode, and small blocks come one after another.
+constexpr Widths for_small_blocks = {8, 7};
+constexpr uint32_t small_block = 1024; // bytes, inflated
+
+void make_tables(BlockCodes &codes, Widths widths) {
     const CodeLengths &lengths = codes.lengths;
-    codes.literals = make_literal_table(lengths.lengths, lengths.literals, widest_literal_table, codes.literal_entries);
-    codes.distances = make_distance_table(lengths.lengths + lengths.literals, lengths.distances, widest_distance_table,
+    codes.literals = make_literal_table(lengths.lengths, lengths.literals, widths.literals, codes.literal_entries);
+    codes.distances = make_distance_table(lengths.lengths + lengths.literals, lengths.distances, widths.distances,
                                           codes.distance_entries);
     if (codes.distances.entries == nullptr) codes.literals = {};
 }
@@ -64,10 +74,13 @@ Stop use_fixed_codes(InflateState &state) {
 Stop use_dynamic_codes(InflateState &state, const CodeLengths &lengths, HuffmanNodePool &pool) {
     if (!allocate_tables(state)) return Stop::no_lookup_memory;
     BlockCodes &codes = *state.dynamic;
+    const uint32_t before = state.window.total - state.dynamic_begin; // bytes since the latest such block began
+    const bool after_small_block = codes.lengths.literals != 0 && before < small_block;
+    state.dynamic_begin = state.window.total;
     if (!are_equal(codes.lengths, lengths)) {
         codes.lengths = lengths;
         codes.trees_are_grown = false;
-        make_tables(codes);
+        make_tables(codes, after_small_block ? for_small_blocks : widest);
     }
     use_tables(state, codes.literals, codes.distances);
     state.codes = nullptr;

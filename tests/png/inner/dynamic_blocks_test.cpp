@@ -120,6 +120,54 @@ TEST(Inflate, a_block_with_the_code_lengths_of_the_one_before_is_decoded_by_its_
 
 namespace {
 
+// A code of each length: 1 for the end, from 2 on for `first` and the literals behind it.
+DynamicCodes stairs(size_t first) {
+    DynamicCodes codes;
+    codes.literal_lengths.resize(257);
+    for (uint8_t length = 2; length <= 15; ++length)
+        codes.literal_lengths[first + length - 2] = length;
+    codes.literal_lengths[first + 14] = 15;
+    codes.literal_lengths[256] = 1;
+    return codes;
+}
+
+// All of these literals, over and over.
+Tokens stairs_literals(uint32_t first, size_t count) {
+    Tokens tokens;
+    for (size_t i = 0; i < count; ++i)
+        tokens.push_back(literal(first + static_cast<uint32_t>(i % 15)));
+    return tokens;
+}
+
+} // namespace
+
+// Wide ones would cost more than such blocks are worth.
+TEST(Inflate, tables_behind_a_small_block_are_narrow_and_decode_the_same) {
+    const struct {
+        uint32_t first;
+        size_t bytes;
+        uint32_t width;
+    } blocks[] = {{0, 15, 11}, {100, 0, 8}, {0, 1023, 8}, {50, 1024, 8}, {100, 1500, 11}, {20, 15, 11}, {100, 90, 8}};
+    Deflate deflate;
+    Tokens all;
+    for (const auto &block : blocks) {
+        const Tokens tokens = stairs_literals(block.first, block.bytes);
+        deflate.dynamic(stairs(block.first), tokens, Last::no);
+        all.insert(all.end(), tokens.begin(), tokens.end());
+    }
+    deflate.fixed({}, Last::yes);
+    expect_inflates_to(zlib_stream(deflate), expand(all));
+
+    Inflater inflater(zlib_stream(deflate), {.pause_at_blocks = true});
+    for (const auto &block : blocks) {
+        ASSERT_EQ(inflater.call(), Stop::block_ended);
+        EXPECT_EQ(inflater.state.dynamic->literals.width, block.width)
+            << "literals from " << block.first << " on, " << block.bytes << " bytes";
+    }
+}
+
+namespace {
+
 // 257 + 1 lengths in which 'a' and the end have codes of one bit, sent in runs.
 DynamicCodes run_codes(const std::vector<LengthSymbol> &sequence, size_t distance_count = 1) {
     DynamicCodes codes;
