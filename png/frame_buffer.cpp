@@ -61,15 +61,14 @@ uint64_t frame_words(const PngDecodeState &state) {
 }
 
 template <class Pixel>
-void write_frame_as(PngDecodeState &state, const OutputSteps &steps) {
+int64_t write_frame_as(const PngDecodeState &state, int64_t position, const OutputSteps &steps) {
     const uint32_t *words = state.interlaceFrame;
-    int64_t position = state.outputCursor;
     for (uint32_t row = 0; row < state.scaledHeight; ++row, words += state.scaledWidth) {
         write_row_clipped(state.output, position, steps.pixel, state.outputFormat, FrameRow<Pixel>{words}, 0,
                           static_cast<int32_t>(state.scaledWidth));
         position += steps.row;
     }
-    state.outputCursor = static_cast<intptr_t>(position);
+    return position;
 }
 
 } // namespace
@@ -87,17 +86,16 @@ void divide_frame_by_alpha(const PngDecodeState &state) {
         state.interlaceFrame[i] = packed(weighted.at(static_cast<size_t>(i)));
 }
 
-void write_frame(PngDecodeState &state, const OutputSteps &steps) {
-    if (state.interlaceFrame == nullptr || state.output.size == 0 || steps.pixel == 0) return;
-    if ((state.ancillaryFlags & PNG_HAS_TRNS) != 0)
-        write_frame_as<FramePixel<true>>(state, steps);
-    else
-        write_frame_as<FramePixel<false>>(state, steps);
+int64_t write_frame(const PngDecodeState &state, int64_t position, const OutputSteps &steps) {
+    if (state.interlaceFrame == nullptr || state.output.size == 0 || steps.pixel == 0) return position;
+    return (state.ancillaryFlags & PNG_HAS_TRNS) != 0 ? write_frame_as<FramePixel<true>>(state, position, steps)
+                                                      : write_frame_as<FramePixel<false>>(state, position, steps);
 }
 
 } // namespace pelm
 
 void __PELMI_WriteOutputDataFromINTBuffer(PngDecodeState *state) {
-    pelm::write_frame(
-        *state, {int64_t{state->outputPixelStep} * pelm::pixel_step_unit(state->outputFormat), state->outputRowStep});
+    const pelm::OutputSteps steps = {int64_t{state->outputPixelStep} * pelm::pixel_step_unit(state->outputFormat),
+                                     state->outputRowStep};
+    state->outputCursor = static_cast<intptr_t>(pelm::write_frame(*state, state->outputCursor, steps));
 }

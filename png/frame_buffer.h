@@ -14,7 +14,8 @@ namespace pelm {
 void clear_frame(const PngDecodeState &state);
 void divide_frame_by_alpha(const PngDecodeState &state);
 
-// Writes the frame with steps that may be larger than the record's words hold.
-void write_frame(PngDecodeState &state, const OutputSteps &steps);
+// Writes the frame from `position` on, the byte offset of its first pixel, and returns that of the row behind its last.
+// Positions and steps may be more than the record's words hold.
+int64_t write_frame(const PngDecodeState &state, int64_t position, const OutputSteps &steps);
 
 } // namespace pelm

@@ -152,9 +152,8 @@ void finish_image(PlainRows &) {}
 void finish_image(Adam7Rows &rows) {
     PngDecodeState &state = *rows.state;
     if (state.isOneToOne != 0 || state.interlaceFrameUsed == 0 || state.output.size == 0) return;
-    state.outputCursor = static_cast<intptr_t>(first_pixel_position(state));
     divide_frame_by_alpha(state);
-    write_frame(state, output_steps(state));
+    write_frame(state, first_pixel_position(state), output_steps(state));
 }
 
 Stop ask_host() {

@@ -62,7 +62,7 @@ struct FinishedColours;
 }
 
 // Fills the record up to the size that hosts of 32-bit systems account for.
-constexpr size_t png_state_fill = 152;
+constexpr size_t png_state_fill = 151;
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed.
 struct PngDecodeState {
@@ -131,6 +131,7 @@ struct PngDecodeState {
     uint32_t rowsDone;
     uint32_t stopRow; // 0: no line mode
     uint32_t firstRowOfCall;
+    // For who calls the frame writer; decodes themselves reckon in 64 bits.
     intptr_t outputCursor; // byte offset in the caller's buffer of the pixel that shows image pixel (0, 0)
     int32_t outputRowStep;
     int32_t outputPixelStep;  // RGB565: in 16-bit units

@@ -76,6 +76,23 @@ TEST_F(PngInterlacedFrame, every_rotation_and_placement_is_honoured) {
             }
 }
 
+// Turned by 270 degrees a flat picture begins where its width reaches down to, far behind a buffer of its height:
+// beyond what 32 bits count.
+TEST_F(PngInterlacedFrame, a_picture_that_begins_far_outside_is_that_without_interlacing) {
+    const struct {
+        uint32_t width, height;
+        Request request;
+    } pictures[] = {{40000, 8, {7, frame | 0x10C, 8, 32769}}, {10, 50000, {0, frame | 0xC, 46341, 10}}};
+    for (const auto &[width, height, request] : pictures) {
+        const Picture picture = interlaced_noise({grey, 4}, false, width, height);
+        const size_t size = buffer_size(picture, request);
+        const Outcome plain = run(file_of(picture), PELM_SOURCE_MEMORY, request, size);
+        const Outcome passes = run(interlaced_file_of(picture), PELM_SOURCE_MEMORY, request, size);
+        EXPECT_EQ(passes.result, 1);
+        EXPECT_TRUE(passes.output == plain.output) << picture.described();
+    }
+}
+
 TEST_F(PngInterlacedFrame, stretching_goes_up_and_down) {
     for (const auto &[image_width, image_height] : {std::pair(7u, 5u), std::pair(1u, 1u), std::pair(3u, 9u)})
         for (const Layout layout : {Layout{rgb, 8}, Layout{grey_alpha, 8}, Layout{indexed, 1}, Layout{grey, 2}}) {
