@@ -1,7 +1,6 @@
 #include "bmp/header.h"
 
 #include <cstdlib>
-#include <limits>
 
 #include "frame/bytes.h"
 #include "frame/sizes.h"

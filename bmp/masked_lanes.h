@@ -46,7 +46,7 @@ inline void store_words(uint8_t *out, const Places565 &pixels) {
 // Writes as many of `count` pixels from `bytes` on as it can, and returns how many.
 template <class Store, class Row>
 int32_t write_masked_lanes(const Row &masks, const uint8_t *bytes, int32_t count, uint8_t *out) {
-    if (kernels() < Kernels::lanes) return 0;
+    if (count < 8 || kernels() < Kernels::lanes) return 0;
     const int32_t groups = count / 8;
     for (int32_t i = 0; i < groups; ++i, bytes += 16, out += 8 * Store::size) {
         Words8 row;

@@ -94,21 +94,28 @@ bool skip_delta(CodeBytes &codes) {
     return take(codes, room, 2) != nullptr;
 }
 
-// Up to the escape that ends the row. False when the codes run out before it.
+void clear_rest(const RunLengthReader &reader, int32_t end) {
+    if (reader.covered < end) std::fill(reader.row + reader.covered, reader.row + end, uint8_t{0});
+}
+
+// Up to the escape that ends the row: only there is what the codes do not set cleared, for a row may be declared to be
+// far longer than the file. False when the codes run out before it.
 // Required: the end of the bitmap ends a row like any other (docs/oddities.md, "Run-length codes").
 bool expand_row(RunLengthReader &reader) {
-    std::fill_n(reader.row, reader.covered, uint8_t{0});
+    const int32_t not_zero = reader.covered; // indices of the row before
     reader.covered = 0;
     uint8_t room[2];
     while (const uint8_t *const code = take(reader.codes, room, 2)) {
         const uint8_t count = code[0];
         const uint8_t value = code[1];
-        if (count != 0)
+        if (count != 0) {
             add_run(reader, count, value);
-        else if (value == end_of_line || value == end_of_bitmap)
+        } else if (value == end_of_line || value == end_of_bitmap) {
+            clear_rest(reader, not_zero);
             return true;
-        else if (!(value == delta ? skip_delta(reader.codes) : add_literals(reader, value)))
+        } else if (!(value == delta ? skip_delta(reader.codes) : add_literals(reader, value))) {
             return false;
+        }
     }
     return false;
 }

@@ -19,7 +19,7 @@ struct RunLengthReader {
     int32_t width;
     int32_t current; // file row that `row` holds; one before the first one at the start
     uint8_t *row;    // `width` indices
-    int32_t covered; // that the codes have set of them; those behind are 0
+    int32_t covered; // that the codes have set of them; when the row has ended, those behind are 0
     int32_t result;  // of the decode, once the codes have run out: 1, or 5 after a failed read
 };
 

@@ -14,12 +14,12 @@ struct BmpOutput {
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed. On a 32-bit system: 40 words in this order.
 struct BmpState {
-    int32_t width;  // stored image, in pixels; above 0
+    int32_t width;  // stored image, in pixels; above 0 once set up
     int32_t height; // absolute; may be 0
     uint16_t bitsPerPixel;
     uint32_t pixelDataOffset; // file offset of the pixel array, as the header says
     uint32_t compression;     // 1 or 2: rows are run-length codes where the depth is 8 or 4; set in two steps only
-    uint8_t *palette;         // blue, green, red, reserved; at least 256 entries, or NULL above 8 bits per pixel
+    uint8_t *palette;         // blue, green, red, reserved; at least 256 entries, or NULL at depths without one
     uint32_t redMask;         // 16 bits per pixel: the colour's bits in a pixel ...
     uint32_t greenMask;
     uint32_t blueMask;

@@ -61,10 +61,11 @@ bool complete_parked(BmpState &state, ImageDecodeInfo &info, const Target &targe
 } // namespace pelm
 
 int32_t ZOTARPELMI_PreInitBMP(ImageDecodeInfo *info, int32_t sampleDivisor) {
-    if (info == nullptr || info->input == nullptr || sampleDivisor == 0) return PELM_RESULT_FAILED;
+    if (info == nullptr || info->input == nullptr) return PELM_RESULT_FAILED;
     InputSource &input = *info->input;
-    if (input.kind == PELM_SOURCE_MEMORY && input.data == nullptr) return PELM_RESULT_FAILED;
     ZOTARPELM_Seek_IO(&input, 0, 0);
+    if (sampleDivisor == 0) return PELM_RESULT_FAILED;
+    if (input.kind == PELM_SOURCE_MEMORY && input.data == nullptr) return PELM_RESULT_FAILED;
     auto *const state = pelm::new_record<BmpState>();
     if (state == nullptr) return PELM_RESULT_FAILED;
 
