@@ -27,6 +27,12 @@ void write_sampled_row(GifDecoderState &state, intptr_t start) {
 
 } // namespace
 
+bool next_row_is_outside(const GifDecoderState &state) {
+    const int64_t row_bytes = int64_t{state.requestedWidth} * GifFormats::size(state.outputFormat);
+    return row_bytes <= 0 ||
+           static_cast<uint64_t>(state.rowsOut) * static_cast<uint64_t>(row_bytes) >= state.output.size;
+}
+
 void pass_over_output_rows(GifDecoderState &state, int32_t wanted) {
     const int64_t ahead = state.samplePosition - int64_t{state.scaledHeight} * state.sourceRow;
     if (state.oneToOne != 0 || ahead < 0 || ahead >= state.scaledHeight) return;

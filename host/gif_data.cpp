@@ -9,6 +9,7 @@ namespace {
 constexpr uint32_t largest_code_size = 11; // above it the decoder gives up before the first pixel
 constexpr uint32_t table_size = 4096;
 constexpr uint32_t widest_code = 12; // bits
+constexpr uint32_t longest_string = table_size;
 
 class Codes {
 public:
@@ -88,15 +89,24 @@ private:
     uint32_t roots_;
     uint32_t next_; // entry to be added; the table stays as it is once it is full
     uint32_t previous_ = 0;
-    uint16_t lengths_[table_size];
+    uint32_t lengths_[table_size]; // an entry that extends itself is longer each time
 };
 
+// As the decoder does it (docs/oddities.md, "Codes that are not in the table").
 uint32_t Strings::pixels_of(uint32_t code) {
-    const bool is_known = code < next_;
-    const uint32_t prefix = previous_ < next_ ? previous_ : 0;
-    const uint32_t pixels = is_known ? lengths_[code] : lengths_[prefix] + 1u;
-    // Of code 0 at last, in steps of one entry each: no string has as many pixels as the table has entries.
-    if (next_ < table_size) lengths_[next_++] = static_cast<uint16_t>(lengths_[prefix] + 1);
+    uint32_t prefix = previous_;
+    uint32_t pixels = 0;
+    if (code < next_) {
+        if (lengths_[code] > longest_string) code = 0;
+        pixels = lengths_[code];
+    } else {
+        if (prefix >= next_ || lengths_[prefix] > longest_string) prefix = 0;
+        pixels = lengths_[prefix] + 1;
+    }
+    if (next_ < table_size) {
+        lengths_[next_] = lengths_[prefix] + 1;
+        ++next_;
+    }
     previous_ = code;
     return pixels;
 }

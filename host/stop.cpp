@@ -1,5 +1,5 @@
 // Cancellation and the deadline: how the application asks for a stop. Those who obey are the poll (status.cpp), the
-// reads of stream sources (source.cpp) and the openers that read everything (spool.cpp).
+// reads of stream sources (read.cpp, feed.cpp, file.cpp) and the openers that read everything (spool.cpp).
 #include "host/stop.h"
 
 #include <cerrno>

@@ -54,10 +54,10 @@ typedef struct PelmAnimationFrame {
  * when `count` is 0: a first call tells how many there are. Delay, disposal and transparency are those that the decoder
  * uses: a frame without a graphic control block of its own has those of the frame before it.
  *
- * These are the frames that the decoder delivers. It tolerates bytes between blocks, scans extensions that it does
- * not know for further blocks, and goes on right behind the last byte of image data that it needed; so the image data
- * is followed code by code, without making pixels of it. Takes about 30 KB of stack, no other memory, and reads the
- * source once from its first byte to its last block.
+ * These are the frames that the decoder delivers, but for files whose trailer comes before any image: they have none
+ * here. It tolerates bytes between blocks, scans extensions that it does not know for further blocks, and goes on right
+ * behind the last byte of image data that it needed; so the image data is followed code by code, without making pixels
+ * of it. Takes about 40 KB of stack, no other memory, and reads the source once from its first byte to its last block.
  *
  * Returns 0 and leaves the source at its first byte; EINVAL when the decoder would not accept the header; ESPIPE when
  * the source cannot be moved back, after a few bytes of it were lost: spool it. `*animation` is zeroed then. A read

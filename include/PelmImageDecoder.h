@@ -262,10 +262,11 @@ PELM_API int32_t ZOTARPELMI_DecodeGIFIter(ImageDecodeInfo *info, void *outBuffer
 /* Gives up a decode in progress and frees all of it. 1, or 0 for a NULL `info`. */
 PELM_API int32_t ZOTARPELMI_AbortGIFIter(ImageDecodeInfo *info);
 
-/* Up to `rowsWanted` further rows, unturned and left-aligned, to a buffer of rowsWanted rows of outWidth pixels. Call
- * again while decoderState is not NULL: PELM_RESULT_DONE for the rows of a call, PELM_RESULT_FAILED when there are no
- * more although the image is not complete. Interlaced images are refused; nothing leaks. A reduced image needs one more
- * call behind its last row, which writes nothing. */
+/* Up to `rowsWanted` further rows, unturned and left-aligned, to a buffer of rowsWanted rows of outWidth pixels, as
+ * the decode's first call has it: later ones go on with that. Call again while decoderState is not NULL:
+ * PELM_RESULT_DONE for the rows of a call, PELM_RESULT_FAILED when there are no more although the image is not
+ * complete. Interlaced images are refused; nothing leaks. A reduced image needs one more call behind its last row,
+ * which writes nothing. */
 PELM_API int32_t ZOTARPELMI_DecodeGIFLine(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight,
                                           int32_t rowsWanted);
 
@@ -285,7 +286,7 @@ PELM_API int32_t ZOTARPELMI_DecodeGIFLine(ImageDecodeInfo *info, void *outBuffer
 PELM_API int32_t ZOTARPELMI_DecodeAGIF(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
 
 /* The same in slices of about 16 rows: PELM_RESULT_MORE while a frame is in progress. Allocates no tables and sets
- * hasTransparency, of the next frame, only. */
+ * neither frameDelay nor colorTableState, but hasTransparency, of the next frame. */
 PELM_API int32_t ZOTARPELMI_DecodeAGIFIter(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
 
 /* Gives up an animation and frees its state, but not the two tables. 1, or 0 for a NULL `info`. */

@@ -44,8 +44,11 @@ struct Lines {
     int32_t wanted;
 
     Taken take_row(GifDecoderState &state) const {
-        if (state.interlaced == 0 && state.output.size == 0) pass_over_output_rows(state, wanted);
         for (uint32_t consumed = 0; state.rowsOut < wanted;) {
+            if (state.interlaced == 0 && next_row_is_outside(state)) {
+                pass_over_output_rows(state, wanted);
+                if (state.rowsOut >= wanted) break;
+            }
             if (PELMI_GIFMakeOut1Row(&state, 0, &consumed) == 0) return Taken::failed;
             if (consumed != 0) return state.rowsOut < wanted ? Taken::next : Taken::enough;
         }

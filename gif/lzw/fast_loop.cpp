@@ -9,7 +9,7 @@
 namespace pelm {
 namespace {
 
-inline void put_group(uint8_t *at, Group group) {
+inline void put_group(uint8_t *at, PixelGroup group) {
     static_assert(std::endian::native == std::endian::little, "the first pixel is the lowest byte");
     std::memcpy(at, &group, sizeof group);
 }

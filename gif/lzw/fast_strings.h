@@ -11,12 +11,12 @@
 namespace pelm {
 
 // The last group's pixels, the first of them lowest and zeros above the last one.
-using Group = uint64_t;
+using PixelGroup = uint64_t;
 
 constexpr int32_t group_pixels = 8;
 
 struct FastEntry {
-    Group group;
+    PixelGroup group;
     uint32_t link; // length - 1 below, and above it the code of the groups before
 };
 

@@ -1,4 +1,5 @@
 // The row writers: the order of rows, what they refuse, and what they use up.
+#include "gif/line_rows.h"
 #include "tests/gif/inner/decoding_record.h"
 
 namespace pelm::test {
@@ -146,6 +147,30 @@ TEST_F(GifRows, a_frame_row_left_of_and_across_the_right_edge_is_cut_and_the_res
         }
         for (uint32_t i = 6; i < 12; ++i)
             state.canvas[i] = i;
+    }
+}
+
+// Rows of a line call may be longer than any buffer, and more than can be counted in its bytes.
+TEST_F(GifRows, rows_behind_the_buffer_are_known_without_overflow) {
+    GifDecoderState state{};
+    state.outputFormat = 12;
+    const struct {
+        int32_t width, rows_before;
+        size_t bytes;
+        bool outside;
+    } cases[] = {{5, 0, 1, false},
+                 {5, 1, 20, true},
+                 {5, 1, 21, false},
+                 {5, 0, 0, true},
+                 {INT32_MAX, 0, INT32_MAX, false},
+                 {INT32_MAX, 1, INT32_MAX, true},
+                 {INT32_MAX, INT32_MAX, PTRDIFF_MAX, true},
+                 {0, 0, 0, true}};
+    for (const auto &[width, rows_before, bytes, outside] : cases) {
+        state.requestedWidth = width;
+        state.rowsOut = rows_before;
+        state.output.size = bytes;
+        EXPECT_EQ(next_row_is_outside(state), outside) << "row " << rows_before << " of " << width << " pixels";
     }
 }
 
