@@ -28,8 +28,6 @@ bool begins_with_bm(const Plan &plan) {
     return plan.file.size() >= 2 && plan.file[0] == 'B' && plan.file[1] == 'M';
 }
 
-constexpr int32_t overclaim = 1000;
-
 // Whether the read that was just served told more than it delivered.
 bool overclaims() {
     const uint32_t from = PelmTest_Faults()->overclaimingReadsFrom;
@@ -109,7 +107,7 @@ void Account::note(const PelmTestCall &call) {
     }
     const uint64_t file = plan_.file.size();
     came_short_ = call.result < call.amount && !overclaims();
-    knows_screen_ |= call.position == 0 && call.result >= (overclaims() ? overclaim : 0) + gif_screen_bytes;
+    knows_screen_ |= call.position == 0 && call.result >= gif_screen_bytes;
     // Once is enough: data without end would be read without end.
     if (overclaims()) PelmTest_Faults()->overclaimingReadsFrom = 0;
     bytes_read_ += call.result > 0 ? static_cast<uint64_t>(call.result) : 0;
