@@ -1,14 +1,23 @@
 #include "fuzz/account.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
+
+#include "bmp/state.h"
+#include "frame/bytes.h"
+#include "tests/gif/support/gif_blocks.h"
 
 namespace pelm::fuzz {
 namespace {
 
+using Blocks = std::vector<uint32_t>; // sizes, in the order of their allocation
+
 constexpr uint64_t most_for_a_still_gif = 464u << 10;
 
 constexpr size_t bmp_header_bytes = 54;
+constexpr int32_t gif_screen_bytes = 10; // of the header: up to where the screen's sides are known
+constexpr uint32_t png_read_buffer = 16384;
 
 bool is_bmp_header_unsupported(const Plan &plan) {
     const uint8_t size = plan.file[14];
@@ -23,6 +32,31 @@ bool begins_with_bm(const Plan &plan) {
 bool overclaims() {
     const uint32_t from = PelmTest_Faults()->overclaimingReadsFrom;
     return from != 0 && PelmTest_Counters()->reads >= from;
+}
+
+// Those that are alive, the last `count`.
+Blocks newest_blocks(uint64_t count) {
+    Blocks blocks;
+    const uint64_t alive = PelmTest_Counters()->liveBlocks;
+    for (uint64_t i = alive - count; i < alive; ++i)
+        blocks.push_back(PelmTest_LiveBlock(i, nullptr));
+    return blocks;
+}
+
+// docs/formats.md, "Memory".
+uint32_t bmp_palette_block(const Plan &plan) {
+    const uint32_t offset = read_u32le(&plan.file[10]);
+    const int32_t entries = offset <= bmp_header_bytes ? 13 : static_cast<int16_t>((offset - bmp_header_bytes) / 4);
+    return std::max<uint32_t>(1024, 4 * static_cast<uint32_t>(std::max(entries, 0)));
+}
+
+// The record; and the palette, when it is what breaks off. Some refusals come before both.
+bool are_refused_bmp_blocks(const Blocks &blocks, const Plan &plan, bool may_have_palette) {
+    if (blocks.empty() || blocks == Blocks{sizeof(BmpState)}) return true;
+    if (!may_have_palette || blocks.size() != 2) return false;
+    // A read that told too much may have promised a header that is not there.
+    const uint32_t palette = plan.file.size() >= bmp_header_bytes ? bmp_palette_block(plan) : blocks[1];
+    return blocks == Blocks{sizeof(BmpState), palette};
 }
 
 } // namespace
@@ -73,6 +107,7 @@ void Account::note(const PelmTestCall &call) {
     }
     const uint64_t file = plan_.file.size();
     came_short_ = call.result < call.amount && !overclaims();
+    knows_screen_ |= call.position == 0 && call.result >= gif_screen_bytes;
     // Once is enough: data without end would be read without end.
     if (overclaims()) PelmTest_Faults()->overclaimingReadsFrom = 0;
     bytes_read_ += call.result > 0 ? static_cast<uint64_t>(call.result) : 0;
@@ -84,7 +119,7 @@ void Account::begin_call(bool was_idle) {
     before_ = *PelmTest_Counters();
     was_idle_ = was_idle;
     allocated_ = bytes_allocated_ = reads_ = bytes_read_ = 0;
-    has_no_first_ = has_no_second_ = came_short_ = false;
+    has_no_first_ = has_no_second_ = came_short_ = knows_screen_ = false;
 }
 
 // A refusal that leaves what was allocated by then: a header of another size, or a read that came short.
@@ -95,24 +130,54 @@ bool Account::is_refused_bmp() const {
     return came_short_ || (has_header && is_bmp_header_unsupported(plan_));
 }
 
-// In blocks: what a call leaves for good, as the header says.
-uint64_t Account::stated_leak(const Call &call, const Ending &ending, uint64_t freed) const {
+// All that a still decode has, so that nothing may have been freed. Only a row for a wider image, for which there was
+// no memory, has taken the place of the screen's.
+bool Account::is_broken_gif(const Ending &ending, uint64_t leaked, uint64_t freed) const {
+    if (ending.result != PELM_RESULT_FAILED || !ending.told_the_size || ending.found_an_image) return leaked == 0;
+    const bool has_no_row = PelmTest_Counters()->failedAllocations != before_.failedAllocations;
+    const Blocks blocks = newest_blocks(leaked);
+    if (blocks.empty()) return false;
+    // Of a screen that no read has delivered the row alone tells.
+    const uint32_t width = knows_screen_ ? read_u16le(&plan_.file[6]) : blocks.back() / 4;
+    Blocks stated = test::gif_still_blocks(width);
+    const uint64_t taken = stated.size();
+    if (has_no_row) stated.erase(stated.end() - 2);
+    return blocks == stated && allocated_ == taken && freed == (has_no_row ? 1 : 0);
+}
+
+// Record and palette are freed. Without a read that told too much the file says whether there is one.
+uint64_t Account::blocks_but_palette(const Call &call, uint64_t held, uint64_t freed) const {
+    if (held == 0) return 0;
+    const bool is_sure = plan_.faults.overclaimingReadsFrom == 0 && plan_.file.size() >= bmp_header_bytes;
+    const uint32_t bits = is_sure ? read_u16le(&plan_.file[plan_.file[14] == 12 ? 24 : 28]) : 0;
+    const uint64_t stated = held > 1 && bits <= 8 ? 2 : 1;
+    check(call, freed == stated || (!is_sure && freed == 1), "freed other than the record and its palette");
+    return held - freed;
+}
+
+// Whether this is what a call leaves for good, as the header says.
+bool Account::is_stated_leak(const Call &call, const Ending &ending, uint64_t leaked, uint64_t freed) const {
     const bool failed = ending.result == PELM_RESULT_FAILED;
     const uint64_t held = before_.liveBlocks - lost_;
     switch (call.leaks) {
-    case Leaks::nothing: return 0;
-    case Leaks::broken_gif: return failed && ending.told_the_size && !ending.found_an_image ? allocated_ - freed : 0;
-    case Leaks::read_buffer:
-        if (plan_.kind == PELM_SOURCE_MEMORY || allocated_ == 0) return 0;
-        return plan_.kind != PELM_SOURCE_STREAM || (allocated_ == 1 && has_no_second_) ? 1 : 0;
-    case Leaks::refused_bmp: return failed && was_idle_ && is_refused_bmp() ? allocated_ : 0;
-    case Leaks::unsigned_bmp: return failed && (bytes_read_ < 2 || !begins_with_bm(plan_)) ? allocated_ : 0;
-    case Leaks::all: return held;
-    case Leaks::all_but_palette:
-        check(call, freed <= 2 && (freed > 0) == (held > 0), "freed more than the record and its palette");
-        return held - freed;
+    case Leaks::nothing: return leaked == 0;
+    case Leaks::broken_gif: return is_broken_gif(ending, leaked, freed);
+    case Leaks::read_buffer: {
+        const bool has_no_record = allocated_ == 1 && has_no_second_;
+        const bool leaks =
+            allocated_ != 0 && (plan_.kind == PELM_SOURCE_STREAM ? has_no_record : plan_.kind != PELM_SOURCE_MEMORY);
+        return newest_blocks(leaked) == (leaks ? Blocks{png_read_buffer} : Blocks{});
     }
-    return 0;
+    case Leaks::refused_bmp:
+        if (!failed || !was_idle_ || !is_refused_bmp()) return leaked == 0;
+        return leaked == allocated_ && are_refused_bmp_blocks(newest_blocks(leaked), plan_, came_short_ && reads_ == 2);
+    case Leaks::unsigned_bmp:
+        if (!failed || (bytes_read_ >= 2 && begins_with_bm(plan_))) return leaked == 0;
+        return leaked == allocated_ && are_refused_bmp_blocks(newest_blocks(leaked), plan_, false);
+    case Leaks::all: return leaked == held;
+    case Leaks::all_but_palette: return leaked == blocks_but_palette(call, held, freed);
+    }
+    return false;
 }
 
 // What a call costs is bounded by what it reads, allocates and writes; compressed rows take two bytes each.
@@ -141,7 +206,7 @@ void Account::end_call(const Call &call, const Ending &ending, uint64_t pixels) 
     if (!is_by_itself && !ending.idle) return;
     check(call, now.liveBlocks >= owned, "freed what it had lost");
     const uint64_t leaked = now.liveBlocks - owned;
-    check(call, leaked == stated_leak(call, ending, now.frees - before_.frees), "leaks other than the header states");
+    check(call, is_stated_leak(call, ending, leaked, now.frees - before_.frees), "leaks other than the header states");
     lost_ += leaked;
 }
 

@@ -51,7 +51,10 @@ private:
     static void observe(void *account, const PelmTestCall *call);
     void note(const PelmTestCall &call);
     bool is_refused_bmp() const;
-    uint64_t stated_leak(const Call &call, const Ending &ending, uint64_t freed) const;
+    bool is_broken_gif(const Ending &ending, uint64_t leaked, uint64_t freed) const;
+    uint64_t blocks_but_palette(const Call &call, uint64_t held, uint64_t freed) const;
+    // In blocks.
+    bool is_stated_leak(const Call &call, const Ending &ending, uint64_t leaked, uint64_t freed) const;
     void look_at_work(const Call &call, uint64_t pixels) const;
 
     const Plan &plan_;
@@ -65,7 +68,8 @@ private:
     uint64_t allocated_ = 0, bytes_allocated_ = 0;      // by successful allocations
     bool has_no_first_ = false, has_no_second_ = false; // of them: they failed
     uint64_t reads_ = 0, bytes_read_ = 0;
-    bool came_short_ = false; // the last read
+    bool came_short_ = false;   // the last read
+    bool knows_screen_ = false; // GIF: a read delivered the sides
 };
 
 } // namespace pelm::fuzz

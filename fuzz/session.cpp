@@ -225,14 +225,16 @@ void Session::look_at(const Call &call, const Step &step, int32_t result) {
 
 void Session::look_at_buffers() {
     const ExactBytes *const buffers[] = {box_.get(), kept_.get(), rows_.get()};
+    uint64_t hashed = outcome_.pixels.empty() ? 0 : outcome_.pixels.back();
     for (const ExactBytes *const each : buffers) {
         if (each == nullptr) continue;
         if (!each->is_intact_before()) give_reason("a byte before the output was written");
         if (!plan_.looks_at_pixels) continue;
-        outcome_.pixels = hash(outcome_.pixels, each->bytes(), each->size());
+        hashed = hash(hashed, each->bytes(), each->size());
         outcome_.wrote_anything |=
             std::any_of(each->bytes(), each->bytes() + each->size(), [](uint8_t byte) { return byte != background; });
     }
+    if (plan_.looks_at_pixels) outcome_.pixels.push_back(hashed);
 }
 
 // Animations leave the two tables to the caller.

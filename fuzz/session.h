@@ -12,9 +12,9 @@ namespace pelm::fuzz {
 // What can be seen of a decode, or of a sequence of calls.
 struct Outcome {
     std::vector<int32_t> results;
-    std::vector<Sides> scaled;   // after each call, as far as it is known by then
-    uint64_t pixels = 0;         // of all buffers after each call, hashed, where the plan looks at them
-    bool wrote_anything = false; // the same: a byte of a buffer is another one than before
+    std::vector<Sides> scaled;    // after each call, as far as it is known by then
+    std::vector<uint64_t> pixels; // where the plan looks at them, after each call: all buffers so far, hashed
+    bool wrote_anything = false;  // the same: a byte of a buffer is another one than before
     bool operator==(const Outcome &) const = default;
 };
 

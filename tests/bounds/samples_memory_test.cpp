@@ -156,28 +156,6 @@ TEST_F(SamplesMemory, every_decode_takes_what_is_stated_and_gives_it_back) {
             }
 }
 
-TEST_F(SamplesMemory, ten_thousand_decodes_in_a_row_do_not_grow) {
-    const std::vector<Sample> all = samples();
-    uint64_t most_at_first = 0;
-    for (size_t count = 0; count < 10000;) {
-        for (const Sample &sample : all)
-            for (const Way way : ways_of(sample)) {
-                const std::vector<uint32_t> kinds = kinds_of(sample);
-                Bytes file = sample.bytes;
-                file.resize(std::min<size_t>(file.size(), 3000)); // breaks off among the pixels
-                if (count % 3 == 1) file[file.size() - 1 - count % 900] ^= 0x55;
-                decode(file, way, {kinds[count % kinds.size()], 7, 0, 40, 30, 9, false});
-                ASSERT_TRUE(left_nothing()) << sample.name << ", " << name_of(way) << ", decode " << count;
-                ++count;
-            }
-        if (most_at_first == 0) most_at_first = work().peak_bytes;
-        EXPECT_LE(work().peak_bytes, most_at_first + 16384) << "other kinds of sources come later";
-        host.allocations.clear();
-        host.reads.clear();
-        host.seeks.clear();
-    }
-}
-
 TEST_F(SamplesMemory, a_refusal_that_leaks_grows_by_its_record_and_no_more) {
     BmpFile file = noise_bmp(variant_named("eight_bits"), 9, 9, false);
     file.header_size = 108;

@@ -3,6 +3,7 @@
 // stated (fuzz/account.h), and the same request is decoded afterwards as ever.
 #include <gtest/gtest.h>
 
+#include "tests/gif/support/gif_builder.h"
 #include "tests/sweeps/at_fault.h"
 #include "tests/sweeps/extent.h"
 #include "tests/sweeps/host_failures.h"
@@ -12,7 +13,7 @@ namespace {
 
 using fuzz::Format;
 
-enum class Files { whole, cut_short, samples };
+enum class Files { whole, cut_short, samples, long_gifs };
 
 struct Part {
     const char *name;
@@ -22,6 +23,28 @@ struct Part {
     uint64_t step = 1;
 };
 
+Input animation_of(const char *name, uint16_t width, uint16_t height, const std::vector<test::ImagePlace> &places) {
+    test::GifFile gif;
+    gif.screen(width, height, test::distinct_table(256), 1);
+    uint8_t frame = 0;
+    for (const test::ImagePlace &place : places) {
+        gif.control({.disposal = static_cast<uint8_t>(frame % 4), .transparent = frame % 2 == 1 ? 3 : -1, .delay = 7});
+        gif.image(place, test::noise_pixels(size_t{place.width} * place.height, 256, frame + 1u), 8,
+                  frame % 3 == 1 ? test::distinct_table(256, frame) : test::ColourTable{});
+        ++frame;
+    }
+    return {name, Format::gif, width, height, gif.trailer().bytes};
+}
+
+// Reads end in the middle of some frames, and between others; of one file in the middle of the first.
+std::vector<Input> long_gifs() {
+    const test::ImagePlace whole{0, 0, 90, 70}, narrow{7, 11, 60, 50}, interlaced{5, 0, 80, 65, true};
+    const test::ImagePlace long_one{3, 5, 160, 110};
+    return {
+        animation_of("gif_long", 90, 70, {whole, narrow, interlaced, narrow, interlaced, whole, interlaced, narrow}),
+        animation_of("gif_of_long_images", 165, 120, {long_one, narrow, long_one})};
+}
+
 // Samples are read in several pieces; there are more of these in one than there is time for.
 std::vector<Input> inputs_of(const Part &part) {
     std::vector<Input> inputs;
@@ -29,6 +52,7 @@ std::vector<Input> inputs_of(const Part &part) {
         for (const Input &input : all)
             if (input.format == part.format) inputs.push_back(input);
     };
+    if (part.files == Files::long_gifs) return long_gifs();
     if (part.files == Files::samples) {
         add(sample_inputs());
         return inputs;
@@ -89,10 +113,19 @@ private:
             fault.set(plan.faults);
             const fuzz::Report faulty = fuzz::carry_out(plan);
             const Expectation expectation = expectation_of(decode, setting, sound, fault);
-            if (const std::string wrong = flaw(expectation, sound, faulty); !wrong.empty() && failures_++ < 10)
+            const fuzz::Outcome cut =
+                expectation.needs_cut() ? cut_outcome(decode, setting, expectation.cut) : fuzz::Outcome{};
+            if (const std::string wrong = flaw(expectation, sound, cut, faulty); !wrong.empty() && failures_++ < 10)
                 ADD_FAILURE() << where() << ": " << wrong;
             ++runs;
         }
+    }
+
+    static fuzz::Outcome cut_outcome(const Decode &decode, const Setting &setting, size_t size) {
+        fuzz::Plan plan = plan_of(decode, setting);
+        plan.looks_at_pixels = true;
+        plan.file.resize(size);
+        return fuzz::carry_out(plan).outcome;
     }
 
     std::string where() const { return decode_->name() + ", " + setting_->name() + ", " + fault_.name(); }
@@ -125,6 +158,7 @@ INSTANTIATE_TEST_SUITE_P(Decoding, FailingHosts,
                                          Part{"cut_wbmp", Format::wbmp, Files::cut_short, 90},
                                          Part{"cut_png", Format::png, Files::cut_short, 80000},
                                          Part{"cut_gif", Format::gif, Files::cut_short, 25000},
+                                         Part{"long_gifs", Format::gif, Files::long_gifs, 5000},
                                          Part{"sample_pngs", Format::png, Files::samples, 100, 23},
                                          Part{"sample_gifs", Format::gif, Files::samples, 100, 23}),
                          [](const auto &part) { return std::string(part.param.name); });

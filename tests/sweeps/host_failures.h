@@ -1,4 +1,5 @@
-// What a decode makes of one thing that its host does wrong: it fails, save for a short list of exceptions.
+// What a decode makes of one thing that its host does wrong: it fails, save for a short list of exceptions. Whatever
+// comes of it, the calls before the one that it strikes are as ever.
 #pragma once
 
 #include "tests/sweeps/plans.h"
@@ -28,20 +29,30 @@ enum class Ends {
     unwritten,       // the results are as without the fault, and nothing is written
     results_as_ever, // the results are
     failed_or_results_as_ever,
-    short_of_rows, // the results are, but a line call may say that the data ended
-    somehow        // any result that the call has
+    short_of_rows,        // the results are, but a line call may say that the data ended
+    as_cut,               // everything is as of a file that ends where the fault strikes
+    frame_as_ever_or_cut, // what the call that is struck leaves in the buffer is
+    failed_where_needed,  // failed, unless that file gives everything as ever
+    somehow               // any result that the call has
 };
 
 struct Expectation {
     Ends ends;
     const char *reason;
+    uint32_t call = 0; // that the fault strikes, from 0
+    size_t cut = 0;    // bytes that the source delivered by then, and in that read
+
+    bool needs_cut() const {
+        return ends == Ends::as_cut || ends == Ends::frame_as_ever_or_cut || ends == Ends::failed_where_needed;
+    }
 };
 
 // `sound`: of the same decode without the fault.
 Expectation expectation_of(const Decode &decode, const Setting &setting, const fuzz::Report &sound,
                            const HostFault &fault);
 
-// What is wrong with it, or "".
-std::string flaw(const Expectation &expectation, const fuzz::Report &sound, const fuzz::Report &faulty);
+// What is wrong with it, or "". `cut`: what comes of the cut file, where the expectation needs it.
+std::string flaw(const Expectation &expectation, const fuzz::Report &sound, const fuzz::Outcome &cut,
+                 const fuzz::Report &faulty);
 
 } // namespace pelm::sweeps

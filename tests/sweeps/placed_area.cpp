@@ -1,7 +1,10 @@
 #include "tests/sweeps/placed_area.h"
 
 #include <algorithm>
+#include <optional>
 #include <string_view>
+
+#include "frame/bytes.h"
 
 namespace pelm::sweeps {
 namespace {
@@ -32,11 +35,53 @@ bool is_byte(const Input &input, size_t at, uint8_t value) {
 }
 
 bool is_grey_of_8_bits(const Placing &placing) {
-    return is_byte(*placing.decode->input, 24, 8) && is_byte(*placing.decode->input, 25, 0);
+    const Input &png = *placing.decode->input;
+    return is_byte(png, 24, 8) && is_byte(png, 25, 0) && is_byte(png, 28, 0); // not interlaced
+}
+
+bool is_square(const Placing &placing) {
+    return placing.scaled_width == placing.scaled_height;
 }
 
 bool is_exact_and_turned(const Placing &placing) {
-    return placing.setting->placement == PELM_PLACE_EXACT && is_sideways(placing);
+    return placing.setting->placement == PELM_PLACE_EXACT && is_sideways(placing) && !is_square(placing);
+}
+
+struct GifImage {
+    int32_t top, width, height;
+    bool is_cut; // its data ends with the file
+};
+
+size_t gif_table_bytes(uint8_t packed) {
+    return (packed & 0x80) != 0 ? size_t{3} << ((packed & 7) + 1) : 0;
+}
+
+// Behind the sub-blocks that begin at `at`; nothing when the file ends first.
+std::optional<size_t> behind_sub_blocks(const Bytes &file, size_t at) {
+    while (at < file.size() && file[at] != 0)
+        at += file[at] + size_t{1};
+    return at < file.size() ? std::optional(at + 1) : std::nullopt;
+}
+
+// The first one, of files whose blocks are sound up to there.
+std::optional<GifImage> first_image_of(const Input &gif) {
+    constexpr size_t header_bytes = 13, descriptor_bytes = 10;
+    const Bytes &file = gif.bytes;
+    std::optional<size_t> at = header_bytes + gif_table_bytes(file[10]);
+    while (at && *at < file.size() && file[*at] == 0x21)
+        at = behind_sub_blocks(file, *at + 2);
+    if (!at || file.size() < *at + descriptor_bytes || file[*at] != 0x2C) return {};
+    const uint8_t *const descriptor = &file[*at];
+    const size_t data = *at + descriptor_bytes + gif_table_bytes(descriptor[9]) + 1;
+    return GifImage{read_u16le(descriptor + 3), read_u16le(descriptor + 5), read_u16le(descriptor + 7),
+                    !behind_sub_blocks(file, data)};
+}
+
+// Where the rows below it are cleared.
+bool lacks_rows(const Placing &placing) {
+    const Input &gif = *placing.decode->input;
+    const std::optional<GifImage> image = first_image_of(gif);
+    return image && (image->is_cut || gif.name == "gif_damaged") && image->top + image->height <= gif.height;
 }
 
 constexpr Exception bmp_exceptions[] = {
@@ -51,13 +96,17 @@ constexpr Exception bmp_exceptions[] = {
 
 constexpr Exception png_exceptions[] = {
     {"Exact placement of turned images", is_exact_and_turned},
-    {"Rotation pixel for pixel", [](const Placing &placing) { return is_one_to_one(placing) && is_sideways(placing); }},
+    {"Rotation pixel for pixel",
+     [](const Placing &placing) { return is_one_to_one(placing) && is_sideways(placing) && !is_square(placing); }},
     {"RGB565 turned by 270 degrees",
      [](const Placing &placing) {
-         return placing.setting->format == PELM_FORMAT_RGB565 && placing.setting->rotation == PELM_ROTATE_270;
+         return placing.setting->format == PELM_FORMAT_RGB565 && placing.setting->rotation == PELM_ROTATE_270 &&
+                !is_one_to_one(placing) && !is_square(placing);
      }},
     {"Reduced grey images of 8 bits",
-     [](const Placing &placing) { return is_grey_of_8_bits(placing) && is_turned(placing); }},
+     [](const Placing &placing) {
+         return is_grey_of_8_bits(placing) && is_sideways(placing) && !is_one_to_one(placing) && !is_square(placing);
+     }},
 };
 
 constexpr Exception gif_exceptions[] = {
@@ -69,11 +118,9 @@ constexpr Exception gif_exceptions[] = {
          return is_one_to_one(placing) && is_turned(placing) && !is_call(placing, "DecodeGIFLine") &&
                 (format == PELM_FORMAT_ARGB8888 || format == PELM_FORMAT_RGBA8888 || format == PELM_FORMAT_BGRA8888);
      }},
-    {"Missing rows of a GIF", [](const Placing &placing) { return is_call(placing, "DecodeGIF"); }},
-    {"Line calls",
-     [](const Placing &placing) { // an image that is wider than its screen
-         return is_call(placing, "DecodeGIFLine") && is_one_to_one(placing);
-     }},
+    {"Missing rows of a GIF",
+     [](const Placing &placing) { return is_call(placing, "DecodeGIF") && !is_turned(placing) && lacks_rows(placing); },
+     [](const Area &placed, int32_t row, uint8_t byte) { return byte == 0 && row >= placed.top; }},
 };
 
 } // namespace
@@ -82,7 +129,11 @@ Area placed_area(const Placing &placing) {
     const int32_t width = placing.scaled_width, height = placing.scaled_height;
     const int32_t free_width = placing.buffer_width - width;
     if (is_call(placing, "DecodeBMPLine")) return {free_width >> 1, 0, width, height};
-    if (is_call(placing, "DecodeGIFLine")) return {0, 0, width, height};
+    if (is_call(placing, "DecodeGIFLine")) {
+        // The image's own columns: it may be wider than its screen, or narrower.
+        const std::optional<GifImage> image = first_image_of(*placing.decode->input);
+        return {0, 0, image && is_one_to_one(placing) ? image->width : width, height};
+    }
     if (placing.decode->input->format == Format::wbmp)
         return {(free_width + 1) >> 1, (placing.buffer_height - height + 1) >> 1, width, height};
     const int32_t across = is_sideways(placing) ? height : width, down = is_sideways(placing) ? width : height;

@@ -24,6 +24,8 @@ Area placed_area(const Placing &placing);
 struct Exception {
     const char *oddity;
     bool (*holds)(const Placing &placing);
+    // What may stand in this row outside the placed area; NULL: anything.
+    bool (*allows)(const Area &placed, int32_t row, uint8_t byte) = nullptr;
 };
 std::span<const Exception> exceptions_of(fuzz::Format format);
 
