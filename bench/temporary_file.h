@@ -3,6 +3,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <filesystem>
 #include <fstream>
 #include <string>
 #include <unistd.h>
@@ -23,8 +24,8 @@ public:
     // Written at the first call.
     const std::string &path_with(const Bytes &bytes) {
         if (!path_.empty()) return path_;
-        char name[] = "/tmp/pelm-bench-XXXXXX";
-        const int descriptor = mkstemp(name);
+        std::string name = std::filesystem::temp_directory_path() / "pelm-bench-XXXXXX";
+        const int descriptor = mkstemp(name.data());
         if (descriptor < 0) return path_;
         close(descriptor);
         path_ = name;

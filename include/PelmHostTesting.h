@@ -27,7 +27,9 @@ typedef struct PelmTestFaults {
     uint32_t failingAllocationsFrom;
     uint32_t largestBlock;  /* larger blocks fail; 0: no limit. At first 64 MiB */
     uint64_t mostLiveBytes; /* what would exceed it fails; 0: no limit */
-    int32_t filling;        /* new blocks hold this byte, at first 0xA5; negative: whatever they happen to hold */
+    /* New blocks hold this byte, at first 0xA5, and freed ones its complement, at first 0x5A, until the C library uses
+     * them again. Negative: whatever they happen to hold */
+    int32_t filling;
     uint32_t failingRead;
     uint32_t failingReadsFrom;
     int32_t failingReadResult; /* at first -1 */

@@ -1,6 +1,7 @@
-// Under MemorySanitizer (the `memory` preset): every way of every input, on host memory that nothing has filled. No
-// byte that was never written may decide anything, or come out: not in the buffer, not in the request, not in the
-// colour tables. A plain program, because GoogleTest and the C++ library are not instrumented.
+// Under MemorySanitizer (the `memory` preset): every input by every call in every format, in some of all settings, on
+// host memory that nothing has filled. No byte that was never written may decide anything, or come out: not in the
+// buffer, not in the request, not in the colour tables. A plain program, because GoogleTest and the C++ library are not
+// instrumented.
 #include <sanitizer/msan_interface.h>
 
 #include <cstdio>

@@ -24,14 +24,20 @@ protected:
     Comparison() { PelmTest_Reset(); }
     ~Comparison() override { PelmTest_Reset(); }
 
-    // Counts a file. False when both read it, to other pixels, and `explanation` is "".
+    // Counts a file that both read. False when its pixels are others, and `explanation` is "".
     bool agree(const Bytes &file, const Bytes &ours, const Bytes &theirs, const std::string &explanation);
-    void tell_all(const char *peer, uint64_t files, uint64_t of_all);
+    // Besides that: of a file that readers may take in different ways a model says what this library must show.
+    bool agree_with_model(const Bytes &file, const Bytes &ours, const Bytes &model);
+    // The complete form is meant to come to so many files, and so many that both read.
+    void tell_all(const char *peer, uint64_t files, uint64_t of_all, uint64_t of_both);
 
     Random random{GetParam() + 1300};
     uint64_t only_ours = 0, only_theirs = 0, neither = 0, same = 0;
 
 private:
+    bool are_the_same(const Bytes &file, const Bytes &ours, const Bytes &expected, const char *whose);
+
+    uint64_t by_model_ = 0;
     std::map<std::string, uint64_t> explained_;
 };
 

@@ -65,7 +65,7 @@ class GifPeers : public Comparison {};
 TEST_P(GifPeers, show_the_same_pixels) {
     const std::vector<Input> inputs = inputs_of(small_inputs(), fuzz::Format::gif);
     const fuzz::Call &one_shot = fuzz::decoding_calls(fuzz::Format::gif).front();
-    const uint32_t all = by_extent(100u, 1500u, 10000u);
+    const uint32_t all = by_extent(100u, 1500u, 15000u);
     for (uint32_t i = 0; i < all; ++i) {
         const Bytes &sound = inputs[random.below(static_cast<uint32_t>(inputs.size()))].bytes;
         const Bytes file =
@@ -82,7 +82,7 @@ TEST_P(GifPeers, show_the_same_pixels) {
         }
         ++(ours ? only_ours : read ? only_theirs : neither);
     }
-    tell_all("giflib", all, 10000);
+    tell_all("giflib", all, 15000, 6000);
 }
 
 INSTANTIATE_TEST_SUITE_P(Shards, GifPeers, testing::Range(0u, 2u));

@@ -75,7 +75,7 @@ class PngPeers : public Comparison {};
 TEST_P(PngPeers, show_the_same_pixels) {
     const std::vector<Input> inputs = inputs_of(small_inputs(), fuzz::Format::png);
     const fuzz::Call &one_shot = fuzz::decoding_calls(fuzz::Format::png).front();
-    const uint32_t all = by_extent(100u, 1000u, 10000u);
+    const uint32_t all = by_extent(100u, 1000u, 30000u);
     for (uint32_t i = 0; i < all; ++i) {
         const Bytes &sound = inputs[random.below(static_cast<uint32_t>(inputs.size()))].bytes;
         const Bytes file = random.one_in(3) ? with_right_checksums(mutated(random, sound, 33)) : any_png_file(random);
@@ -91,7 +91,7 @@ TEST_P(PngPeers, show_the_same_pixels) {
         }
         ++(ours ? only_ours : picture ? only_theirs : neither);
     }
-    tell_all("libpng", all, 10000);
+    tell_all("libpng", all, 30000, 14000);
 }
 
 INSTANTIATE_TEST_SUITE_P(Shards, PngPeers, testing::Range(0u, 3u));

@@ -1,11 +1,12 @@
 #!/usr/bin/env bash
-# readme_example.sh WORK_FOLDER COMPILER [OPTION...] [-- EMULATOR...]: the first C block of README.md compiles as strict
-# C99 with the given options, and decodes: first the BMP built here, then every BMP of samples/.
-# The program takes the name of a BMP file as its argument and returns 0 when it was decoded.
+# document_example.sh DOCUMENT bmp|png WORK_FOLDER COMPILER [OPTION...] [-- EMULATOR...]: the first C block of a document
+# compiles as strict C99 with the given options, and succeeds with every file of samples/ of that format; with a BMP that
+# is built here, too.
+# The program takes the name of such a file as its argument and returns 0 when all is well.
 set -euo pipefail
 root=$(cd "$(dirname "${BASH_SOURCE[0]}")/../.." && pwd)
-work=$1
-shift
+document=$1 format=$2 work=$3
+shift 3
 compile=()
 while [[ $# -gt 0 && $1 != -- ]]; do
     compile+=("$1")
@@ -14,17 +15,17 @@ done
 emulator=("${@:2}")
 
 fail() {
-    printf 'README.md: %s\n' "$*"
+    printf '%s: %s\n' "$document" "$*"
     exit 1
 }
 
 mkdir -p "$work"
 cd "$work"
-[[ -f $root/README.md ]] || fail 'not found'
+[[ -f $root/$document ]] || fail 'not found'
 awk '{ sub(/\r$/, "") }
      inside && /^ *```/ { exit }
      inside
-     /^ *```[cC]( |$)/ { inside = 1 }' "$root/README.md" >example.c
+     /^ *```[cC]( |$)/ { inside = 1 }' "$root/$document" >example.c
 grep -q 'main *(' example.c || fail 'its first ```c block, which must be a whole program, is missing or has no main'
 
 "${compile[0]}" -std=c99 -pedantic -Wall -Wextra -Werror example.c -o example "${compile[@]:1}" ||
@@ -37,7 +38,10 @@ grep -q 'main *(' example.c || fail 'its first ```c block, which must be a whole
     printf '\0\0\xff\0\xff\0\0\0\xff\0\0\xff\xff\xff\0\0'
 } >tiny.bmp
 
-for picture in tiny.bmp "$root"/samples/*.bmp; do
-    [[ -f $picture ]] || continue
+pictures=0
+for picture in tiny.bmp "$root"/samples/*; do
+    [[ $picture == *."$format" && -f $picture ]] || continue
     "${emulator[@]}" ./example "$picture" || fail "the C example fails for $picture"
+    pictures=$((pictures + 1))
 done
+[[ $pictures -gt 0 ]] || fail "no ${format}s to try it with"
