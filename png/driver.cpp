@@ -124,6 +124,7 @@ uint32_t PELMI_FastImgDecodePng(ImageDecodeInfo *info, void *output, int32_t box
 
 uint32_t PELMI_DestroyDecodePng(ImageDecodeInfo *info) {
     using pelm::free_block;
+    if (info == nullptr) return 1;
     auto *state = static_cast<PngDecodeState *>(info->decoderState);
     if (state == nullptr) return 1;
     free_block(state->rowBuffers);

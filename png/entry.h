@@ -4,11 +4,11 @@
 #include "png/state.h"
 
 // The driver behind all public calls: sets up on the first call, goes on with the decode on later ones. `rows` is the
-// number of rows to decode in this call; 0 and below: no limit. Internal codes.
+// number of rows to decode in this call; 0: the limit of an earlier call stays; below 0: none. Internal codes.
 PELM_EXPORT uint32_t PELMI_FastImgDecodePng(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
                                             int32_t rows);
 
-// Frees the state in decoderState, if there is one, with all that it owns. Returns 1.
+// Frees the state in decoderState, if there is one, with all that it owns. Returns 1, also for a NULL `info`.
 PELM_EXPORT uint32_t PELMI_DestroyDecodePng(ImageDecodeInfo *info);
 
 static_assert(pelm::lies_on_word(offsetof(PngTrInfo, ownsBlock), 9));

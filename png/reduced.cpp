@@ -1,8 +1,5 @@
 // Reduced (and stretched) output of all other layouts: each output pixel is made of four samples at the quarter points
-// of its footprint, weighted by their alpha.
-//
-// A word holds R, G, B, A from the high byte down. Sample k of the four adds (c + k) >> 2 per channel, so that four
-// equal samples sum to exactly themselves.
+// of its footprint, weighted by their alpha (png/weighted.h).
 #include <algorithm>
 
 #include "frame/host.h"
