@@ -100,7 +100,7 @@ uint32_t Strings::pixels_of(uint32_t code) {
         if (lengths_[code] > longest_string) code = 0;
         pixels = lengths_[code];
     } else {
-        if (prefix >= next_ || lengths_[prefix] > longest_string) prefix = 0;
+        if (prefix >= next_) prefix = 0; // a known one behind another code is not too long
         pixels = lengths_[prefix] + 1;
     }
     if (next_ < table_size) {

@@ -172,6 +172,35 @@ TEST(AnimationDecode, delivers_the_frames_that_are_told_of_damaged_files) {
     EXPECT_GT(compared, static_cast<size_t>(rounds / 2));
 }
 
+// Behind each clear code the first entry extends itself: it grows beyond what the decoder takes, and is used then.
+TEST(AnimationDecode, delivers_the_frames_that_are_told_of_strings_that_are_too_long) {
+    constexpr uint32_t clear = 4, first_entry = 6, code_bits = 3;
+    for (const int clears : {4090, 4093, 4094, 4095, 4096, 4097, 4100, 4200}) {
+        Bytes data(5000);
+        size_t bits = 0;
+        const auto put = [&](uint32_t code) {
+            for (uint32_t i = 0; i < code_bits; ++i, ++bits)
+                data[bits / 8] = static_cast<uint8_t>(data[bits / 8] | (code >> i & 1) << bits % 8);
+        };
+        for (int i = 0; i < clears; ++i)
+            for (const uint32_t code : {clear, first_entry, 0u})
+                put(code);
+        put(first_entry);
+        data.resize((bits + 7) / 8);
+        SmallGif gif;
+        gif.width = gif.height = 100;
+        Bytes bytes = gif_header(gif);
+        for (int frame = 0; frame < 2; ++frame) {
+            const Bytes descriptor = {',', 0, 0, 0, 0, 100, 0, 100, 0, 0, 2};
+            bytes.insert(bytes.end(), descriptor.begin(), descriptor.end());
+            append_blocks(bytes, data);
+        }
+        bytes.push_back(';');
+        for (const uint32_t kind : kinds)
+            EXPECT_TRUE(compare(bytes, kind)) << clears;
+    }
+}
+
 // Codes of any value, most of them none of the table's, behind a clear code and each other.
 TEST(AnimationDecode, delivers_the_frames_that_are_told_of_data_of_any_codes) {
     std::mt19937 random(5);
