@@ -78,6 +78,7 @@ TEST_F(BmpTwoStep, a_first_step_that_fails_leaves_the_request_as_it_was) {
             ImageDecodeInfo info = marked_info(&source.source, {});
             info.decoderState = &info;
             EXPECT_EQ(ZOTARPELMI_PreInitBMP(&info, c.divisor), 0) << c.what;
+            EXPECT_EQ(host.seeks.size(), 1u) << c.what << ": whatever is refused";
             EXPECT_EQ(info.decoderState, &info) << c.what;
             EXPECT_TRUE(marks_intact(info)) << c.what;
             EXPECT_EQ(host.live_blocks().size(), c.left) << c.what;

@@ -57,6 +57,7 @@ TEST_F(PngDriver, enlarges_by_whole_numbers_what_a_caller_asks_for_and_the_box_h
 
 TEST_F(PngDriver, without_a_request_or_a_state_there_is_nothing_to_decode) {
     EXPECT_EQ(PELMI_FastImgDecodePng(nullptr, nullptr, 1, 1, 0), PNG_NO_MEMORY);
+    EXPECT_EQ(PELMI_DestroyDecodePng(nullptr), 1u);
     ImageDecodeInfo info{};
     PngInputBuffer input{};
     uint32_t total = 0;
