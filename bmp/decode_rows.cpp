@@ -1,5 +1,7 @@
 #include "bmp/decode_rows.h"
 
+#include "bmp/geometry.h"
+
 namespace pelm {
 
 // Rows are finished in file order: a bottom-up file's first row goes lowest. The record's row step is negated for
@@ -8,9 +10,10 @@ namespace pelm {
 // sequential sources").
 OutputRows output_rows(const BmpState &state, intptr_t cursor, int32_t count) {
     const int64_t step = state.rowStep;
-    const int64_t pixel_step = int64_t{state.pixelStep} * pixel_step_unit(state.outputFormat);
-    if (state.topDown == 0) return {cursor + step * (count - 1), -step, pixel_step};
-    return {cursor, state.input->kind == PELM_SOURCE_SEQUENTIAL ? step : -step, pixel_step};
+    const int64_t pixel_step = pixel_step_bytes(state.pixelStep, state.outputFormat);
+    const int64_t first = band_cursor(state, cursor);
+    if (state.topDown == 0) return {first + step * (count - 1), -step, pixel_step};
+    return {first, state.input->kind == PELM_SOURCE_SEQUENTIAL ? step : -step, pixel_step};
 }
 
 int32_t last_file_row(const BmpState &state, Band band) {

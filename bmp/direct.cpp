@@ -22,7 +22,7 @@ MaskedRow masked_row(const uint8_t *row, Channel red, Channel green, Channel blu
 template <class Load>
 void write_direct(const Load &load, void *output, int32_t count, int32_t pixel_step, uint32_t format) {
     write_row_as(format, load, 0, count, static_cast<uint8_t *>(output),
-                 static_cast<ptrdiff_t>(pixel_step) * pixel_step_unit(format));
+                 static_cast<ptrdiff_t>(pixel_step_bytes(pixel_step, format)));
 }
 
 } // namespace

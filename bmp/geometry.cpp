@@ -57,11 +57,17 @@ SetUp set_geometry(BmpState &state, ImageDecodeInfo &info, const Target &target)
 // Required: by the rows of this call, whatever the last one's were (docs/oddities.md, "Bands of changing height").
 void advance_cursor(BmpState &state, int32_t rows) {
     const int64_t row_step = state.topDown != 0 ? -int64_t{state.rowStep} : state.rowStep;
-    const int64_t cursor = state.outputCursor + row_step * rows;
-    if (std::abs(cursor) > farthest_position)
+    const int64_t cursor = band_cursor(state, state.outputCursor) + row_step * rows;
+    if (std::abs(cursor) > farthest_clipped) {
         state.output.buffer.size = 0;
-    else
-        state.outputCursor = static_cast<intptr_t>(cursor);
+        return;
+    }
+    state.outputCursor = static_cast<intptr_t>(cursor);
+    state.output.cursorCarry = cursor - state.outputCursor;
+}
+
+int64_t band_cursor(const BmpState &state, intptr_t cursor) {
+    return state.output.cursorCarry + cursor;
 }
 
 } // namespace pelm

@@ -13,7 +13,7 @@ template <int32_t depth>
 void write_indexed(const uint8_t *row, void *output, int32_t count, int32_t pixel_step, const uint8_t *palette,
                    uint32_t format) {
     write_row_as(format, IndexedRow<depth>{row, palette}, 0, count, static_cast<uint8_t *>(output),
-                 static_cast<ptrdiff_t>(pixel_step) * pixel_step_unit(format));
+                 static_cast<ptrdiff_t>(pixel_step_bytes(pixel_step, format)));
 }
 
 // Whether a table of finished colours is worth its making for this band.
@@ -66,7 +66,7 @@ BmpStop PELMI_BMP_Write1bitOutput(const uint8_t *row, void *output, int32_t coun
                                   const uint8_t *palette, uint32_t outputFormat) {
     write_indexed<1>(row, output, count, pixelStep, palette, outputFormat);
     const int32_t written = bytes_per_pixel(outputFormat) == 0 || count < 0 ? 0 : count;
-    const ptrdiff_t bytes = static_cast<ptrdiff_t>(pixelStep) * pixel_step_unit(outputFormat) * written;
+    const int64_t bytes = pixel_step_bytes(pixelStep, outputFormat) * written;
     // The place behind the last pixel may lie outside the buffer: it is counted as an address, not as a pointer.
     const uintptr_t stop = reinterpret_cast<uintptr_t>(output) + static_cast<uintptr_t>(bytes);
     return {row + written / 8, reinterpret_cast<uint8_t *>(stop)};

@@ -31,6 +31,7 @@ void place_band(BmpState &band, void *output, int32_t row_pixels, int32_t rows) 
     const int64_t margin = (int64_t{row_pixels} - band.scaledWidth) >> 1;
     band.output.buffer = {static_cast<uint8_t *>(output), bytes};
     band.outputCursor = static_cast<intptr_t>(margin * pixel_bytes);
+    band.output.cursorCarry = 0;
     band.rowStep = static_cast<int32_t>(row_step);
     band.pixelStep = pixel_bytes / pixel_step_unit(band.outputFormat);
 }

@@ -10,6 +10,7 @@
 struct BmpOutput {
     OutputBuffer buffer;
     int32_t stagingBytes; // kinds 0 and 2: of InputSource.data, whatever the caller makes of bufferSize later
+    int64_t cursorCarry;  // what outputCursor has no room for: a multiple of 2^32, and 0 on 64-bit systems
 };
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed. On a 32-bit system: 40 words in this order.

@@ -47,7 +47,7 @@ bool complete_parked(BmpState &state, ImageDecodeInfo &info, const Target &targe
     uint8_t bytes[bmp_header_bytes];
     ZOTARPELM_OsMemcpy(bytes, state.headerCopy, bmp_header_bytes);
     ZOTARPELM_OsMemset(state.headerCopy, 0, bmp_header_bytes); // a completed record is none that is parked
-    state.output = {{}, info.input->bufferSize};               // in the same place
+    state.output = {{}, info.input->bufferSize, 0};            // in the same place
     BmpHeader header{};
     if (!parse_parked_header(bytes, header) || !source_is_ready(*info.input, header)) return false;
     if (header.compression == plain_rows && !source_holds_all_rows(*info.input, header)) return false;

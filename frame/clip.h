@@ -19,9 +19,11 @@ struct Run {
     int32_t count;
 };
 
+constexpr int64_t farthest_clipped = int64_t{1} << 62;
+
 // Of `count` pixels at position, position + step, ..., those that lie wholly within 0 .. buffer_size: always one run,
-// since positions only grow or only fall. |position| is at most 2^62; `step` is not 0 and
-// at most 2^32 either way.
+// since positions only grow or only fall. |position| is at most `farthest_clipped`; `step` is not 0 and at most 2^32
+// either way.
 constexpr Run clip_run(int64_t position, int64_t step, int32_t count, int32_t pixel_bytes, size_t buffer_size) {
     const int64_t last_place = static_cast<int64_t>(buffer_size) - pixel_bytes;
     if (count <= 0 || last_place < 0) return {0, 0};

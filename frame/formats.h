@@ -25,4 +25,8 @@ constexpr int32_t pixel_step_unit(uint32_t format) {
     return format == PELM_FORMAT_RGB565 ? 2 : 1;
 }
 
+constexpr int64_t pixel_step_bytes(int32_t pixel_step, uint32_t format) {
+    return int64_t{pixel_step} * pixel_step_unit(format);
+}
+
 } // namespace pelm

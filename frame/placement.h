@@ -7,6 +7,7 @@
 #include <limits>
 
 #include "PelmImageDecoder.h"
+#include "frame/clip.h"
 
 namespace pelm {
 
@@ -45,7 +46,7 @@ struct BytePlacement {
 
 // How far from the buffer's start, either way, a first pixel may lie: the walk over all rows stays in range from there,
 // in 64 bits.
-constexpr int64_t farthest_position = std::min<int64_t>(std::numeric_limits<intptr_t>::max(), int64_t{1} << 62);
+constexpr int64_t farthest_position = std::min<int64_t>(std::numeric_limits<intptr_t>::max(), farthest_clipped);
 
 // False when it does not fit that record, or lies too far.
 bool place_bytes(int32_t rotation, Size buffer, Size scaled, int32_t pixel_bytes, BytePlacement &placement);

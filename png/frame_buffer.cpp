@@ -95,7 +95,7 @@ int64_t write_frame(const PngDecodeState &state, int64_t position, const OutputS
 } // namespace pelm
 
 void __PELMI_WriteOutputDataFromINTBuffer(PngDecodeState *state) {
-    const pelm::OutputSteps steps = {int64_t{state->outputPixelStep} * pelm::pixel_step_unit(state->outputFormat),
+    const pelm::OutputSteps steps = {pelm::pixel_step_bytes(state->outputPixelStep, state->outputFormat),
                                      state->outputRowStep};
     state->outputCursor = static_cast<intptr_t>(pelm::write_frame(*state, state->outputCursor, steps));
 }

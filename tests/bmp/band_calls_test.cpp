@@ -55,6 +55,36 @@ TEST_F(BmpBandCalls, rows_farther_than_any_buffer_reaches_are_not_written) {
     EXPECT_TRUE(host.live_blocks().empty());
 }
 
+// In a buffer of its unturned size a turned image's rows begin far above or below it, later ones beyond what 32 bits
+// count, and still run through it.
+TEST_F(BmpBandCalls, rows_of_turned_images_that_begin_far_outside_are_those_of_one_call) {
+    const struct {
+        int32_t width, height;
+        uint32_t format;
+        int turns;
+    } images[] = {{46409, 135, 0, 1}, {46273, 137, 0, 3}, {37694, 288, 1, 3}};
+    for (const auto &[width, height, format, turns] : images)
+        for (const bool top_down : {false, true}) {
+            const BmpRequest request{format, turns, PELM_PLACE_EXACT, height, width};
+            const Bytes file = file_bytes(noise_bmp(variant_named("one_bit"), width, height, top_down));
+            const size_t size = static_cast<size_t>(width) * static_cast<size_t>(height) * (format == 0 ? 2 : 3);
+            const auto decoded_in = [&](const std::vector<int32_t> &rows) {
+                TestSource source(PELM_SOURCE_MEMORY, file);
+                return decode_by(calls_of(request, rows), source, request, size);
+            };
+            const BmpDecode at_once = decoded_in({height});
+            ASSERT_EQ(at_once.result, 1);
+            ASSERT_NE(at_once.output, Bytes(size, background));
+            for (const int32_t rows : {100, 50}) {
+                const BmpDecode in_bands =
+                    decoded_in(std::vector<int32_t>(static_cast<size_t>((height - 1) / rows + 1), rows));
+                EXPECT_EQ(in_bands.result, 1);
+                EXPECT_EQ(in_bands.info.decoderState, nullptr);
+                EXPECT_TRUE(in_bands.output == at_once.output) << described(request) << ", bands of " << rows;
+            }
+        }
+}
+
 TEST_F(BmpBandCalls, failed_reads_end_a_band_and_count_its_rows) {
     TestSource source(PELM_SOURCE_STREAM, file_bytes(noise_bmp(rgb24, 9, 7, true)), 28);
     host.faults.failing_read = 4; // header, two rows, and the third
