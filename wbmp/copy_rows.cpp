@@ -34,11 +34,11 @@ void write_bits(const uint8_t *row, int32_t width, uint8_t *__restrict out) {
 
 template <int32_t pixel_bytes>
 bool copy_rows_as(WbmpDrawing &drawing) {
-    uint8_t *out = drawing.output.start + static_cast<ptrdiff_t>(drawing.position);
-    for (int32_t y = 0; y < drawing.image.height; ++y, out += static_cast<ptrdiff_t>(drawing.row_step)) {
+    int64_t position = drawing.position;
+    for (int32_t y = 0; y < drawing.image.height; ++y, position += drawing.row_step) {
         const uint8_t *const row = read_row(drawing.rows, y);
         if (row == nullptr) return false;
-        write_bits<pixel_bytes>(row, drawing.image.width, out);
+        write_bits<pixel_bytes>(row, drawing.image.width, drawing.output.start + static_cast<ptrdiff_t>(position));
     }
     return true;
 }
