@@ -29,10 +29,9 @@ void count_pixels(benchmark::State &state, uint32_t count) {
         benchmark::Counter(count / 1e9, benchmark::Counter::kIsIterationInvariantRate | benchmark::Counter::kInvert);
 }
 
-// In place: what one iteration leaves is noise for the next one.
-void undo_filter(benchmark::State &state, uint8_t filter, uint8_t unit) {
-    std::vector<uint8_t> row = noise(size_t{pixels} * unit + 1, 1);
-    const std::vector<uint8_t> above = noise(size_t{pixels} * unit, 2);
+// In place: what one iteration leaves is what the next one begins with.
+void undo(benchmark::State &state, uint8_t filter, std::vector<uint8_t> row, const std::vector<uint8_t> &above,
+          uint8_t unit) {
     row[0] = filter;
     PngDecodeState decode{};
     decode.bytesPerPixel = unit;
@@ -43,18 +42,13 @@ void undo_filter(benchmark::State &state, uint8_t filter, uint8_t unit) {
     count_pixels(state, pixels);
 }
 
+void undo_filter(benchmark::State &state, uint8_t filter, uint8_t unit) {
+    undo(state, filter, noise(size_t{pixels} * unit + 1, 1), noise(size_t{pixels} * unit, 2), unit);
+}
+
 // All of it one colour.
 void undo_paeth_of_flat_row(benchmark::State &state, uint8_t unit) {
-    std::vector<uint8_t> row(size_t{pixels} * unit + 1);
-    const std::vector<uint8_t> above(size_t{pixels} * unit);
-    row[0] = 4;
-    PngDecodeState decode{};
-    decode.bytesPerPixel = unit;
-    for (auto _ : state) {
-        __PELMI_PngReadFilterRow(&decode, row.data() + 1, above.data(), pixels * unit);
-        benchmark::ClobberMemory();
-    }
-    count_pixels(state, pixels);
+    undo(state, 4, std::vector<uint8_t>(size_t{pixels} * unit + 1), std::vector<uint8_t>(size_t{pixels} * unit), unit);
 }
 
 void undo_two_filters(benchmark::State &state, uint8_t first_filter, uint8_t second_filter, uint8_t unit) {

@@ -6,11 +6,6 @@ namespace {
 
 constexpr uint8_t b_ = background;
 
-void append(Bytes &bytes, std::initializer_list<uint8_t> more) {
-    for (const uint8_t byte : more)
-        bytes.push_back(byte);
-}
-
 class BmpEdgeCases : public HostedTest {
 protected:
     // From memory, into a buffer of just the box.

@@ -18,10 +18,6 @@ void put32(Bytes &bytes, size_t at, uint32_t value) {
     put16(bytes, at + 2, value >> 16);
 }
 
-void append(Bytes &bytes, const Bytes &more) {
-    bytes.insert(bytes.end(), more.begin(), more.end());
-}
-
 void put_core_fields(Bytes &bytes, const BmpFile &file) {
     put16(bytes, 18, static_cast<uint32_t>(file.width));
     put16(bytes, 20, static_cast<uint32_t>(file.height));

@@ -7,9 +7,9 @@
 #include <string>
 #include <vector>
 
-namespace pelm::test {
+#include "tests/support/bytes.h"
 
-using Bytes = std::vector<uint8_t>;
+namespace pelm::test {
 
 // Pixels as stored, counted from the top left: palette indices, 16-bit values, 0xRRGGBB or 0xAARRGGBB.
 using Picture = std::vector<std::vector<uint32_t>>;

@@ -2,14 +2,10 @@
 
 #include <algorithm>
 
+#include "tests/support/bytes.h"
+
 namespace pelm::test {
 namespace {
-
-using Bytes = std::vector<uint8_t>;
-
-void append(Bytes &bytes, const Bytes &more) {
-    bytes.insert(bytes.end(), more.begin(), more.end());
-}
 
 void append_16(Bytes &bytes, uint32_t value) {
     append(bytes, {static_cast<uint8_t>(value), static_cast<uint8_t>(value >> 8)});

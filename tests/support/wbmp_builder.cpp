@@ -2,14 +2,6 @@
 
 namespace pelm::test {
 
-namespace {
-
-void append(Bytes &bytes, const Bytes &more) {
-    bytes.insert(bytes.end(), more.begin(), more.end());
-}
-
-} // namespace
-
 Bytes multi_byte(uint64_t value, size_t length) {
     Bytes bytes;
     do {

@@ -7,6 +7,7 @@
 
 #include "tests/support/bmp_check.h"
 #include "tests/support/quick.h"
+#include "tests/tool/chooser.h"
 
 namespace pelm::test {
 namespace {
@@ -62,20 +63,6 @@ Verdict decoded(const Bytes &bytes, uint32_t kind, Mode mode) {
 bool yields_nothing(const std::string &refusal) {
     return refusal.ends_with(" per pixel are not supported") || refusal.starts_with("a height of 0");
 }
-
-class Chooser {
-public:
-    explicit Chooser(uint32_t seed) : noise_(seed) {}
-    template <class T, size_t count>
-    T among(const T (&values)[count]) {
-        return values[noise_.below(count)];
-    }
-    bool one_in(uint32_t count) { return noise_.below(count) == 0; }
-    uint32_t below(uint32_t limit) { return noise_.below(limit); }
-
-private:
-    Noise noise_;
-};
 
 // Mostly well-formed, with one or another field at the edge of what is accepted.
 BmpFile odd_file(Chooser &choose) {

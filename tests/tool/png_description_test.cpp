@@ -5,26 +5,13 @@
 
 #include "tests/support/bmp_check.h"
 #include "tests/support/quick.h"
+#include "tests/tool/chooser.h"
 #include "tests/tool/png_file.h"
 
 namespace pelm::test {
 namespace {
 
 using Parts = std::vector<PngPart>;
-
-class Chooser {
-public:
-    explicit Chooser(uint32_t seed) : noise_(seed) {}
-    template <class T, size_t count>
-    T among(const T (&values)[count]) {
-        return values[noise_.below(count)];
-    }
-    bool one_in(uint32_t count) { return noise_.below(count) == 0; }
-    uint32_t below(uint32_t limit) { return noise_.below(limit); }
-
-private:
-    Noise noise_;
-};
 
 PngHeader odd_header(Chooser &choose) {
     static constexpr uint8_t depths[] = {0, 1, 2, 3, 4, 8, 16, 32};

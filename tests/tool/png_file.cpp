@@ -2,26 +2,14 @@
 
 #include <zlib.h>
 
+#include "tests/support/bytes.h"
+
 namespace pelm::test {
-namespace {
-
-using Bytes = std::vector<uint8_t>;
-
-void append_u32(Bytes &bytes, uint32_t value) {
-    for (int shift = 24; shift >= 0; shift -= 8)
-        bytes.push_back(static_cast<uint8_t>(value >> shift));
-}
-
-void append(Bytes &bytes, const Bytes &more) {
-    bytes.insert(bytes.end(), more.begin(), more.end());
-}
-
-} // namespace
 
 PngPart header_part(const PngHeader &header) {
     PngPart part = {"IHDR", {}};
-    append_u32(part.data, header.width);
-    append_u32(part.data, header.height);
+    append_u32be(part.data, header.width);
+    append_u32be(part.data, header.height);
     append(part.data, {header.depth, header.colour_type, header.compression, header.filter, header.interlace});
     return part;
 }
@@ -37,12 +25,12 @@ PngPart end_part() {
 Bytes png_bytes(const std::vector<PngPart> &parts) {
     Bytes bytes = {0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0A};
     for (const PngPart &part : parts) {
-        append_u32(bytes, static_cast<uint32_t>(part.data.size()));
+        append_u32be(bytes, static_cast<uint32_t>(part.data.size()));
         const size_t start = bytes.size();
         bytes.insert(bytes.end(), part.type.begin(), part.type.end());
         append(bytes, part.data);
-        append_u32(bytes,
-                   static_cast<uint32_t>(crc32(0, bytes.data() + start, static_cast<uInt>(bytes.size() - start))));
+        append_u32be(bytes,
+                     static_cast<uint32_t>(crc32(0, bytes.data() + start, static_cast<uInt>(bytes.size() - start))));
     }
     return bytes;
 }

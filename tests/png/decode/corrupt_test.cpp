@@ -14,14 +14,6 @@ protected:
         const Request request = own_size(picture);
         return run(build(png), kind, request, buffer_size(picture, request), call, 3);
     }
-    static Request own_size(const Picture &picture) {
-        return {7, 0, static_cast<int32_t>(picture.width), static_cast<int32_t>(picture.height)};
-    }
-    static Bytes after_rows(const Picture &picture, uint32_t rows) {
-        Bytes expected = background(buffer_size(picture, own_size(picture)));
-        draw_rows(picture, own_size(picture), rows, expected);
-        return expected;
-    }
 };
 
 TEST_F(PngCorrupt, files_cut_anywhere_fail_from_every_source) {

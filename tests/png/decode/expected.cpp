@@ -277,6 +277,17 @@ size_t buffer_size(const Picture &picture, const Request &request) {
     return static_cast<size_t>(buffer_pixels(geometry, request)) * pixel_size(request.format);
 }
 
+Request own_size(const Picture &picture, uint32_t format) {
+    return {format, 0, static_cast<int32_t>(picture.width), static_cast<int32_t>(picture.height)};
+}
+
+Bytes after_rows(const Picture &picture, uint32_t rows) {
+    const Request request = own_size(picture);
+    Bytes expected = background(buffer_size(picture, request));
+    draw_rows(picture, request, rows, expected);
+    return expected;
+}
+
 namespace {
 
 std::string listed(const Bytes &bytes, size_t from, size_t count) {

@@ -25,6 +25,8 @@ inline constexpr uint32_t written_formats[] = {0, 1, 5, 6, 7, 8};
 
 size_t pixel_size(uint32_t format);
 
+Request own_size(const Picture &picture, uint32_t format = 7);
+
 // Where the image lies, measured in pixels of the buffer.
 struct Geometry {
     bool one_to_one = false;
@@ -82,6 +84,9 @@ Bytes background(size_t size);
 
 // Bytes of the buffer that a request describes.
 size_t buffer_size(const Picture &picture, const Request &request);
+
+// A buffer of the image's own size, of background but for the first rows.
+Bytes after_rows(const Picture &picture, uint32_t rows);
 
 // Empty when equal; otherwise the first differing pixel with both values.
 std::string difference(const Bytes &expected, const Bytes &got, const Picture &picture, const Request &request);

@@ -10,17 +10,7 @@
 namespace pelm::test {
 namespace {
 
-class PngFailures : public PngDecoding {
-protected:
-    static Request own_size(const Picture &picture) {
-        return {7, 0, static_cast<int32_t>(picture.width), static_cast<int32_t>(picture.height)};
-    }
-    static Bytes after_rows(const Picture &picture, uint32_t rows) {
-        Bytes expected = background(buffer_size(picture, own_size(picture)));
-        draw_rows(picture, own_size(picture), rows, expected);
-        return expected;
-    }
-};
+using PngFailures = PngDecoding;
 
 TEST_F(PngFailures, a_decode_allocates_what_is_documented_in_order) {
     if constexpr (sizeof(void *) == 4) {

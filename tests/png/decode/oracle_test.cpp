@@ -4,8 +4,7 @@
 #include <fstream>
 #include <iostream>
 
-#include "tests/png/decode/decoding.h"
-#include "tests/png/support/libpng_reader.h"
+#include "tests/png/decode/oracle.h"
 
 namespace pelm::test {
 namespace {
@@ -33,24 +32,8 @@ protected:
     }
     static bool interlaced(const Bytes &file) { return file.size() > 28 && file[28] == 1; }
 
-    // Empty when both agree, in every way of calling.
     static std::string disagreement(const Bytes &file) {
-        std::optional<LibpngPicture> picture = read_with_libpng(file);
-        if (!picture) return "libpng refuses it";
-        as_this_library_widens(*picture);
-        const Bytes &wanted = picture->rgba;
-        const Request request{7, 0, static_cast<int32_t>(picture->width), static_cast<int32_t>(picture->height)};
-        for (const uint32_t kind : {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM})
-            for (const Call call : {Call::one_shot, Call::iterative, Call::line}) {
-                const Outcome outcome = run(file, kind, request, wanted.size(), call, 7, 1 << 20);
-                const std::string way = name_of(call) + ", kind " + std::to_string(kind) + ": ";
-                if (const std::string wrong = flaws(outcome); !wrong.empty()) return way + wrong;
-                const auto [a, b] = std::mismatch(wanted.begin(), wanted.end(), outcome.output.begin());
-                if (a != wanted.end())
-                    return way + "byte " + std::to_string(a - wanted.begin()) + " should be " + std::to_string(*a) +
-                           " and is " + std::to_string(*b);
-            }
-        return {};
+        return disagreement_with_libpng(file, {{PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM}}, 7);
     }
 };
 

@@ -7,9 +7,9 @@
 #include <string>
 #include <vector>
 
-namespace pelm::test {
+#include "tests/support/bytes.h"
 
-using Bytes = std::vector<uint8_t>;
+namespace pelm::test {
 
 enum ColourType : uint8_t { grey = 0, rgb = 2, indexed = 3, grey_alpha = 4, rgb_alpha = 6 };
 

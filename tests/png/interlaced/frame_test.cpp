@@ -10,18 +10,7 @@ constexpr uint32_t frame = PELM_INTERLACE_FRAME;
 using PngInterlacedFrame = PngDecoding;
 
 TEST_F(PngInterlacedFrame, every_layout_is_reduced_in_every_format) {
-    for (const Layout layout : all_layouts)
-        for (const bool transparent : {false, true}) {
-            const Picture picture = interlaced_noise(layout, transparent, 37, 23);
-            const Bytes file = interlaced_file_of(picture);
-            for (const auto &[width, height] :
-                 {std::pair(36, 36), std::pair(18, 40), std::pair(9, 9), std::pair(40, 5), std::pair(2, 3)})
-                for (const uint32_t format : written_formats)
-                    for (const uint32_t kind : {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM}) {
-                        reset();
-                        ASSERT_EQ(interlaced_difference(picture, file, kind, {format, frame, width, height}), "");
-                    }
-        }
+    EXPECT_EQ(reduced_noise_difference(frame), "");
 }
 
 TEST_F(PngInterlacedFrame, formats_with_alpha_are_those_of_the_picture_without_interlacing) {

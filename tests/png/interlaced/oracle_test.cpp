@@ -4,8 +4,8 @@
 #include <fstream>
 #include <iostream>
 
+#include "tests/png/decode/oracle.h"
 #include "tests/png/interlaced/passes.h"
-#include "tests/png/support/libpng_reader.h"
 
 namespace pelm::test {
 namespace {
@@ -13,22 +13,7 @@ namespace {
 namespace fs = std::filesystem;
 
 std::string disagreement(const Bytes &file) {
-    std::optional<LibpngPicture> picture = read_with_libpng(file);
-    if (!picture) return "libpng refuses it";
-    as_this_library_widens(*picture);
-    const Bytes &wanted = picture->rgba;
-    const Request request{7, 0, static_cast<int32_t>(picture->width), static_cast<int32_t>(picture->height)};
-    for (const uint32_t kind : all_source_kinds)
-        for (const Call call : {Call::one_shot, Call::iterative, Call::line}) {
-            const Outcome outcome = run(file, kind, request, wanted.size(), call, 0, 1 << 16);
-            const std::string way = name_of(call) + ", kind " + std::to_string(kind) + ": ";
-            if (const std::string wrong = flaws(outcome); !wrong.empty()) return way + wrong;
-            const auto [a, b] = std::mismatch(wanted.begin(), wanted.end(), outcome.output.begin());
-            if (a != wanted.end())
-                return way + "byte " + std::to_string(a - wanted.begin()) + " should be " + std::to_string(*a) +
-                       " and is " + std::to_string(*b);
-        }
-    return {};
+    return disagreement_with_libpng(file, all_source_kinds, 0);
 }
 
 class PngInterlacedOracle : public PngDecoding {};

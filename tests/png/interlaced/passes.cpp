@@ -220,8 +220,23 @@ Picture interlaced_noise(Layout layout, bool transparent, uint32_t width, uint32
     return transparent ? with_transparency(picture, seed) : picture;
 }
 
-Request own_size(const Picture &picture, uint32_t format) {
-    return {format, 0, static_cast<int32_t>(picture.width), static_cast<int32_t>(picture.height)};
+std::string reduced_noise_difference(uint32_t flags) {
+    for (const Layout layout : all_layouts)
+        for (const bool transparent : {false, true}) {
+            const Picture picture = interlaced_noise(layout, transparent, 37, 23);
+            const Bytes file = interlaced_file_of(picture);
+            for (const auto &[width, height] :
+                 {std::pair(36, 36), std::pair(18, 40), std::pair(9, 9), std::pair(40, 5), std::pair(2, 3)})
+                for (const uint32_t format : written_formats)
+                    for (const uint32_t kind : {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM}) {
+                        TestHost::get().reset();
+                        Polling::get().reset();
+                        const std::string found =
+                            interlaced_difference(picture, file, kind, {format, flags, width, height});
+                        if (!found.empty()) return found;
+                    }
+        }
+    return {};
 }
 
 } // namespace pelm::test

@@ -47,9 +47,11 @@ Bytes interlaced_file_of_parts(const Picture &picture, const std::vector<Bytes> 
 std::string interlaced_difference(const Picture &picture, const Bytes &file, uint32_t kind, const Request &request,
                                   Call call = Call::one_shot, size_t bytes_behind = 0);
 
+// The same for noise of every layout in every format, smaller than the picture, with and without transparency. The
+// first difference found; empty when there is none.
+std::string reduced_noise_difference(uint32_t flags);
+
 // Noise, with a tRNS chunk where the colour type can have one.
 Picture interlaced_noise(Layout layout, bool transparent, uint32_t width, uint32_t height, uint32_t seed = 1);
-
-Request own_size(const Picture &picture, uint32_t format = 7);
 
 } // namespace pelm::test

@@ -40,17 +40,6 @@ uint32_t extra_bits_of(const Range (&ranges)[size], uint32_t index) {
     return index < size ? ranges[index].extra_bits : 0;
 }
 
-void append(Bytes &bytes, const Bytes &more) {
-    const size_t size = bytes.size();
-    bytes.resize(size + more.size());
-    std::copy(more.begin(), more.end(), bytes.begin() + static_cast<ptrdiff_t>(size));
-}
-
-void put_u32be(Bytes &bytes, uint32_t value) {
-    append(bytes, {static_cast<uint8_t>(value >> 24), static_cast<uint8_t>(value >> 16),
-                   static_cast<uint8_t>(value >> 8), static_cast<uint8_t>(value)});
-}
-
 constexpr uint8_t code_length_order[19] = {16, 17, 18, 0, 8, 7, 9, 6, 10, 5, 11, 4, 12, 3, 13, 2, 14, 1, 15};
 
 std::vector<LengthSymbol> plain_sequence(const DynamicCodes &codes) {
@@ -306,7 +295,7 @@ uint32_t adler32_of(const Bytes &data) {
 Bytes zlib_stream(const Bytes &deflated, const Bytes &data, uint8_t cmf, uint8_t flg) {
     Bytes stream = {cmf, flg};
     append(stream, deflated);
-    put_u32be(stream, adler32_of(data));
+    append_u32be(stream, adler32_of(data));
     return stream;
 }
 

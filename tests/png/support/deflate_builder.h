@@ -12,9 +12,9 @@
 #include <optional>
 #include <vector>
 
-namespace pelm::test {
+#include "tests/support/bytes.h"
 
-using Bytes = std::vector<uint8_t>;
+namespace pelm::test {
 
 // Bits into bytes, least significant bit of a byte first.
 class BitWriter {

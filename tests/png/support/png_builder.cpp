@@ -8,17 +8,6 @@ namespace pelm::test {
 
 namespace {
 
-void append(Bytes &bytes, const Bytes &more) {
-    const size_t size = bytes.size();
-    bytes.resize(size + more.size());
-    std::copy(more.begin(), more.end(), bytes.begin() + static_cast<ptrdiff_t>(size));
-}
-
-void put_u32be(Bytes &bytes, uint32_t value) {
-    append(bytes, {static_cast<uint8_t>(value >> 24), static_cast<uint8_t>(value >> 16),
-                   static_cast<uint8_t>(value >> 8), static_cast<uint8_t>(value)});
-}
-
 // PNG specification, 9.4, from its wording.
 int32_t paeth_predictor(int32_t a, int32_t b, int32_t c) {
     const int32_t p = a + b - c;
@@ -192,8 +181,8 @@ std::vector<Chunk> idat_chunks(const Bytes &stream, const std::vector<size_t> &s
 
 Chunk ihdr_chunk(const Png &png) {
     Chunk chunk{"IHDR", {}};
-    put_u32be(chunk.data, png.width);
-    put_u32be(chunk.data, png.height);
+    append_u32be(chunk.data, png.width);
+    append_u32be(chunk.data, png.height);
     append(chunk.data, {png.depth, png.colour_type, png.compression_method, png.filter_method, png.interlace});
     return chunk;
 }
@@ -220,9 +209,9 @@ Bytes bytes_of(const Chunk &chunk) {
     Bytes covered(chunk.type.begin(), chunk.type.end());
     append(covered, chunk.data);
     Bytes bytes;
-    put_u32be(bytes, chunk.length.value_or(static_cast<uint32_t>(chunk.data.size())));
+    append_u32be(bytes, chunk.length.value_or(static_cast<uint32_t>(chunk.data.size())));
     append(bytes, covered);
-    put_u32be(bytes, chunk.crc.value_or(crc32_of(covered)));
+    append_u32be(bytes, chunk.crc.value_or(crc32_of(covered)));
     return bytes;
 }
 
