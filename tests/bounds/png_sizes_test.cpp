@@ -53,7 +53,7 @@ std::vector<Asking> askings(uint32_t kind) {
 void expect_stated(const Layout &layout, uint32_t width, uint32_t height) {
     for (const uint8_t interlace : {uint8_t{0}, uint8_t{1}}) {
         const Bytes file = file_of(layout, width, height, interlace);
-        for (const uint32_t kind : {PELM_SOURCE_MEMORY, PELM_SOURCE_STREAM, PELM_SOURCE_SEQUENTIAL})
+        for (const uint32_t kind : every_kind)
             for (const Asking &asking : askings(kind))
                 for (const Way way : png_ways) {
                     reset_work();
