@@ -27,11 +27,13 @@ PELM_API int32_t ZOTARPELM_Read_IO(InputSource *source, void *destination, int32
 
 /*
  * Sets the read position: origin 0 counts `offset` from the first byte of the encoded data, origin 1 from the current
- * position. Returns the distance moved, which is below the distance asked when the data ended first.
+ * position. Returns the distance moved, which is below the distance asked when the data ended first. Only results for
+ * origin 1 are looked at.
  */
 PELM_API int32_t ZOTARPELM_Seek_IO(InputSource *source, int32_t offset, int32_t origin);
 
-/* Memory: NULL on failure; contents need not be cleared; aligned for any type. */
+/* Memory: NULL on failure; contents need not be cleared; aligned for any type. The decoders never free NULL; the
+ * default library's OsFree takes it. */
 PELM_API void *ZOTARPELM_OsMalloc(uint32_t size);
 PELM_API void ZOTARPELM_OsFree(void *block);
 
@@ -127,7 +129,7 @@ typedef int32_t (*PelmHostProgress)(void *user, const InputSource *source);
 PELM_API void PelmHost_SetProgress(PelmHostControl *control, PelmHostProgress progress, void *user);
 
 /* Why decodes under this control have to stop now: 0 not at all, ECANCELED, or ETIMEDOUT (deadline passed). A decode
- * that was done before may have ended well; why a stream source stopped one tells PelmHost_ReadError. */
+ * may have ended well before that. PelmHost_ReadError tells whether a stream source was stopped, and why. */
 PELM_API int PelmHost_StopReason(const PelmHostControl *control);
 
 typedef struct PelmHostCounters {

@@ -82,7 +82,7 @@ PELM_API uint32_t PelmTest_LiveBlock(uint64_t index, const void **block);
 PELM_API void PelmTest_CheckBlocks(void);
 
 /* The first thing that the decoders did and must not do, in English, or NULL: writing outside a block, freeing what is
- * not a block, a negative read, a pause that was asked for and not taken or taken unasked. */
+ * not a block (NULL too), a negative read, a pause that was asked for and not taken or taken unasked. */
 PELM_API const char *PelmTest_Violation(void);
 
 /* ---- Sources ------------------------------------------------------------------------------------------------- */

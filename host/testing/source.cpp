@@ -78,10 +78,10 @@ int32_t ZOTARPELM_Read_IO(InputSource *source, void *destination, int32_t count)
 int32_t ZOTARPELM_Seek_IO(InputSource *source, int32_t offset, int32_t origin) {
     Call call({PELM_TEST_SEEK, 0, source, nullptr, offset, origin, source->hostPosition, 0, nullptr});
     ++account().counters.seeks;
-    const int64_t base = origin == 0 ? 0 : source->hostPosition;
-    int64_t target = base + offset;
+    const int64_t before = source->hostPosition;
+    int64_t target = (origin == 0 ? 0 : before) + offset;
     if (target > end_of(*source)) target = end_of(*source);
     if (target < 0) target = 0;
     move_to(*source, static_cast<int32_t>(target));
-    return call.record.result = static_cast<int32_t>(target - base);
+    return call.record.result = static_cast<int32_t>(target - before);
 }
