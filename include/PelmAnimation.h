@@ -57,9 +57,9 @@ typedef struct PelmAnimationFrame {
  * These are the frames that the decoder delivers, but for files whose trailer comes before any image: they have none
  * here. It tolerates bytes between blocks, scans extensions that it does not know for further blocks, and goes on right
  * behind the last byte of image data that it needed; so the image data is followed code by code, without making pixels
- * of it. Takes about 40 KB of stack, no other memory, and reads the source once from its first byte to its last block.
+ * of it. Takes about 25 KB of stack, no other memory, and reads the source once from its first byte to its last block.
  *
- * Returns 0 and leaves the source at its first byte; EINVAL when the decoder would not accept the header; ESPIPE when
+ * Returns 0 and leaves the source at its first byte; EINVAL when the header is not a GIF's, or breaks off; ESPIPE when
  * the source cannot be moved back, after a few bytes of it were lost: spool it. `*animation` is zeroed then. A read
  * that fails counts as the end of the data; PelmHost_ReadError tells.
  */

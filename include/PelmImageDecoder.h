@@ -2,7 +2,10 @@
  * Still-image decoders for BMP, WBMP, PNG and GIF: the caller-owned records and the public calls.
  *
  * A decode is one request (ImageDecodeInfo) that names an input (InputSource), an output format, a rotation and a
- * placement; a call decodes it straight into a buffer of the caller. Zero both records before the first use.
+ * placement; a call decodes it straight into a buffer of the caller. Zero both records before the first use. The
+ * InputSource stays where it is, and open, from a decode's first call to its end, and `decoderState` is passed only to
+ * calls of the family that has set it: nothing checks that. A one-shot call for BMP, or ZOTARPELMI_PreInitBMP, during
+ * another decode of the same request loses that one's memory.
  * The library allocates, reads and polls only through the host services that PelmHost.h declares.
  *
  * Every call runs on the caller's thread. Decodes with separate requests and sources never disturb each other.
@@ -64,8 +67,8 @@ enum {
     PELM_ROTATE_270 = 0xC,
     PELM_ROTATE_MASK = 0xC,
 
-    PELM_PLACE_FIT = 0x000,     /* reduce to fit the box (never enlarge), keep the aspect, centre */
-    PELM_PLACE_EXACT = 0x100,   /* reduce as for FIT; the buffer holds exactly the scaled image */
+    PELM_PLACE_FIT = 0x000,     /* reduce to fit the box (never enlarge), keep the aspect, centre; other values, too */
+    PELM_PLACE_EXACT = 0x100,   /* reduce as for FIT; the buffer holds exactly the scaled image, in rows of its width */
     PELM_PLACE_STRETCH = 0x700, /* exactly the box, both ways, without keeping the aspect */
     PELM_PLACE_MASK = 0x700,
 
@@ -111,7 +114,8 @@ typedef struct ImageDecodeInfo {
     uint32_t reserved11;
     uint32_t reserved12;
     uint32_t reserved13;
-    uint32_t hasTransparency; /* GIF: 1 when the frame uses a transparent colour */
+    uint32_t hasTransparency; /* GIF: 1 when the image uses a transparent colour. One-shot and iterative calls of still
+                                 images set it; ZOTARPELMI_DecodeAGIFIter does behind a frame, for the next one */
     void *decoderState;       /* the format's own state between calls; NULL when no decode is in progress */
     uint32_t reserved16;
     uint32_t iterative;       /* PNG: 1 during iterative calls */
@@ -124,8 +128,10 @@ typedef struct ImageDecodeInfo {
 /*
  * All decode calls, unless they say otherwise: `output` is a buffer of outWidth x outHeight pixels of the output
  * format, top row first, without padding between rows and with any alignment. In placement PELM_PLACE_EXACT it is
- * instead exactly as large as the scaled image. Pixels that the image does not cover keep their contents, and nothing
- * is written outside the buffer. A NULL `info` gives 0; with a NULL `output` the decode runs and writes nothing.
+ * instead exactly as large as the scaled image: outWidth x outHeight pixels are enough for it in boxes of sides below
+ * 2^22. Pixels that the image does not cover keep their contents, and nothing is written outside the buffer. A NULL
+ * `info` gives 0; with a NULL `output` the decode runs and writes nothing. docs/formats.md says how to ask for an
+ * image's size first.
  */
 
 /*
@@ -161,7 +167,8 @@ PELM_API int32_t ZOTARPELMI_AbortBMPIter(ImageDecodeInfo *info);
  * remain), and the band begins in its first row, centred horizontally only. Never turned; of the placements only
  * PELM_PLACE_STRETCH counts. `rows` may differ from call to call; 0 or fewer decode nothing.
  * PELM_RESULT_DONE, or PELM_RESULT_DATA_ENDED when a read failed before the band was complete; and then `decoderState`
- * is NULL when the image is complete. PELM_RESULT_FAILED for what is refused and without memory.
+ * is NULL when the image is complete. PELM_RESULT_FAILED for what is refused and without memory (no decode is in
+ * progress then), and when the source is gone (then it still is).
  */
 PELM_API int32_t ZOTARPELMI_DecodeBMPLine(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight,
                                           int32_t rows);
@@ -170,8 +177,9 @@ PELM_API int32_t ZOTARPELMI_DecodeBMPLine(ImageDecodeInfo *info, void *output, i
  * The same in two steps, for graphics libraries that choose a divisor and a buffer once they know the size. These calls
  * know RLE8 and RLE4, take every header for one of 40 bytes, and refuse files that are too short for their rows.
  *
- * PreInit reads the header and sets imageWidth, imageHeight, and outputWidth and outputHeight: the same over
- * `sampleDivisor`, the height negative for a top-down file. PELM_RESULT_DONE, and `decoderState` holds a record for
+ * PreInit reads the header and sets imageWidth and imageHeight (positive for a top-down file, too), and outputWidth and
+ * outputHeight: these over `sampleDivisor`, fractions dropped, the height of a top-down file with the other sign. Clear
+ * imageHeight before the request serves a PNG. PELM_RESULT_DONE, and `decoderState` holds a record for
  * DecodeBMPSKIA, or for PELMI_BMP_DestroyBMP when there will be no decode, and for no other call; or
  * PELM_RESULT_FAILED (a divisor of 0 too), and `decoderState` is as it was.
  *
@@ -185,7 +193,7 @@ PELM_API int32_t ZOTARPELMI_PreInitBMP(ImageDecodeInfo *info, int32_t sampleDivi
 PELM_API int32_t ZOTARPELMI_DecodeBMPSKIA(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight);
 
 /* Frees the BMP state record that a decode in progress left in `decoderState`, and its palette; nothing else that
- * hangs from it. Returns 1, or 0 for a NULL `info`. */
+ * hangs from it. `decoderState` is NULL then. Returns 1, or 0 for a NULL `info`. */
 PELM_API int32_t PELMI_BMP_DestroyBMP(ImageDecodeInfo *info);
 
 /*
@@ -212,13 +220,18 @@ PELM_API int32_t ZOTARPELMI_DecodeWBMP(ImageDecodeInfo *info, void *outBuffer, i
  * is NULL afterwards. */
 PELM_API int32_t ZOTARPELMI_DecodePNG(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight);
 
-/* The rows of one deflate block per call: PELM_RESULT_MORE until the image is complete, then PELM_RESULT_DONE. Pass the
- * same box and buffer each time. A first block without a complete row makes every call start over: when two calls bring
- * no row, destroy the decode and use the one-shot call. */
+/* The rows of one deflate block per call: PELM_RESULT_MORE until the image is complete, then PELM_RESULT_DONE, or
+ * PELM_RESULT_FAILED; behind these two decoderState is NULL. Pass the same box and buffer each time. A first block
+ * without a complete row makes every call start over: when two calls bring no row (ZOTARPELM_CheckExStatus is called
+ * behind every row), destroy the decode and use the one-shot call. docs/oddities.md tells more. */
 PELM_API int32_t ZOTARPELMI_DecodePNGIter(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight);
 
-/* Up to `rows` further rows (with 0 no new limit): PELM_RESULT_MORE while rows remain, then PELM_RESULT_DONE. Pixel for
- * pixel every call gets the whole box; scaled output gets a buffer whose first row is the first row of this call. */
+/* Up to `rows` further rows: PELM_RESULT_MORE while rows remain, then PELM_RESULT_DONE or PELM_RESULT_FAILED; the state
+ * goes as for ZOTARPELMI_DecodePNGIter. 0 keeps the limit of the call before, below 0 there is none. `output` is the
+ * WHOLE BOX in every call, never a buffer of `rows` rows: pixel for pixel rows go where they belong; of a reduced image
+ * each call's rows begin where the image begins, behind the margins and turned as the flags say. `rows` counts output
+ * rows (of grey of 8 bits, source rows that are used); where an image is stretched a call may write some more.
+ * Interlaced images take 0 rows only, or as many as info->imageHeight says. */
 PELM_API int32_t ZOTARPELMI_DecodePNGLine(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
                                           int32_t rows);
 
@@ -226,11 +239,12 @@ PELM_API int32_t ZOTARPELMI_DecodePNGLine(ImageDecodeInfo *info, void *output, i
 PELM_API int32_t ZOTARPELMI_DestroyPNGInfo(ImageDecodeInfo *info);
 PELM_API int32_t ZOTARPELMI_AbortPNGIter(ImageDecodeInfo *info);
 
-/* 1 when the PNG at the request's input has an alpha channel or a tRNS chunk, else 0. Leaves the source where it ended,
- * and for kinds 2 and 4 a 16384-byte block allocated. */
+/* 1 when the PNG at the request's input has an alpha channel or a tRNS chunk, else 0; a file that is damaged behind
+ * these still gives 1. Leaves the source where it ended, and for kinds 2 and 4 a 16384-byte block allocated. */
 PELM_API uint32_t PELMI_GetAlphaTrFlag(ImageDecodeInfo *info);
 
-/* A zeroed transparency record for companion code, or NULL; and its end, with the block that it owns. */
+/* A zeroed transparency record for companion code, or NULL; and its end, with the block that it owns, which came from
+ * ZOTARPELM_OsMalloc. The record must not be NULL there; returns 1. */
 typedef struct PngTrInfo {
     uint32_t reserved[9];
     uint32_t ownsBlock;
@@ -278,7 +292,8 @@ PELM_API int32_t ZOTARPELMI_DecodeGIFLine(ImageDecodeInfo *info, void *outBuffer
  */
 
 /* One frame per call: PELM_RESULT_DONE when another one follows, PELM_RESULT_LAST_FRAME for the last one (the decode's
- * memory has been freed), or PELM_RESULT_FAILED (likewise). Sets frameDelay and colorTableState. The first call of a
+ * memory has been freed), or PELM_RESULT_FAILED (likewise). Behind the last frame of a file without a trailer that is
+ * PELM_RESULT_FAILED, too, with the frame written. Sets frameDelay and colorTableState. The first call of a
  * decode overwrites globalColorTable and localColorTable with new blocks of 1024 bytes from ZOTARPELM_OsMalloc: the
  * CALLER frees and clears both after each decode, also after a failed one. globalColorTable then holds the global
  * table's raw RGB triplets. localColorTable holds, after a call, the raw triplets of the next frame's own table, or

@@ -7,7 +7,7 @@ namespace pelm {
 
 enum class CallStyle : uint8_t { one_shot, iterative, line };
 
-// `rows`: how many to decode in this call; 0: the limit of an earlier call stays; below 0: none. Internal codes.
+// `rows`: how many to decode in this call; 0: the limit of an earlier call stays; below 0: no limit. Internal codes.
 uint32_t drive_png(ImageDecodeInfo &info, void *output, int32_t boxWidth, int32_t boxHeight, int32_t rows,
                    CallStyle style);
 
