@@ -1,13 +1,11 @@
 // What decodes of the samples take from the host, block by block, against what docs/formats.md states.
 #include <algorithm>
-#include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <numeric>
 
 #include "bmp/state.h"
 #include "frame/bytes.h"
 #include "png/state.h"
+#include "tests/bounds/samples.h"
 #include "tests/bounds/ways.h"
 #include "tests/bounds/work.h"
 #include "tests/gif/support/gif_blocks.h"
@@ -21,27 +19,6 @@ using SamplesMemory = BoundsTest;
 using Blocks = std::vector<uint32_t>;
 
 constexpr int32_t buffer_size = 4096; // that sources propose
-
-struct Sample {
-    std::string name;
-    Bytes bytes;
-    bool ends_with(const char *ending) const { return name.ends_with(ending); }
-};
-
-std::vector<Sample> samples() {
-    std::vector<Sample> all;
-    for (const auto &entry : std::filesystem::directory_iterator(PELM_SAMPLES)) {
-        const std::string name = entry.path().filename().string();
-        if (!name.ends_with("bmp") && !name.ends_with(".png") && !name.ends_with(".gif")) continue;
-        std::ifstream file(entry.path(), std::ios::binary);
-        all.push_back({name, {std::istreambuf_iterator<char>(file), {}}});
-    }
-    return all;
-}
-
-struct Size {
-    uint32_t width, height;
-};
 
 Blocks bmp_blocks(const Bytes &file, uint32_t kind, Way way, uint32_t scaled_width, int32_t calls) {
     const uint32_t width = read_u32le(&file[18]), bits = read_u16le(&file[28]), offset = read_u32le(&file[10]);
@@ -58,14 +35,14 @@ Blocks bmp_blocks(const Bytes &file, uint32_t kind, Way way, uint32_t scaled_wid
     return blocks;
 }
 
-Blocks wbmp_blocks(Size size, uint32_t kind, uint32_t scaled_width) {
+Blocks wbmp_blocks(SampleSize size, uint32_t kind, uint32_t scaled_width) {
     Blocks blocks;
     if (kind == PELM_SOURCE_STREAM) blocks = {20, (size.width + 7) / 8};
     blocks.insert(blocks.end(), 2, 4 * scaled_width);
     return blocks;
 }
 
-Blocks png_blocks(const Bytes &file, Size size, uint32_t kind, uint32_t scaled_width) {
+Blocks png_blocks(const Bytes &file, SampleSize size, uint32_t kind, uint32_t scaled_width) {
     constexpr uint32_t channels[7] = {1, 0, 3, 1, 2, 0, 4};
     const uint32_t row = (size.width * file[24] * channels[file[25]] + 7) / 8 + 1;
     Blocks blocks{sizeof(PngDecodeState), sizeof(PngInputBuffer)};
@@ -77,29 +54,12 @@ Blocks png_blocks(const Bytes &file, Size size, uint32_t kind, uint32_t scaled_w
     return blocks;
 }
 
-Blocks gif_blocks(Size size, Way way) {
+Blocks gif_blocks(SampleSize size, Way way) {
     Blocks blocks = way == Way::frames ? gif_request_tables : Blocks{};
     const bool animated = way == Way::frames || way == Way::frames_iterative;
     const Blocks state = animated ? gif_animated_blocks(size.width, size.height) : gif_still_blocks(size.width);
     blocks.insert(blocks.end(), state.begin(), state.end());
     return blocks;
-}
-
-Size size_of(const Sample &sample) {
-    const Bytes &file = sample.bytes;
-    if (sample.ends_with(".png")) return {read_u32be(&file[16]), read_u32be(&file[20])};
-    if (sample.ends_with(".gif")) return {read_u16le(&file[6]), read_u16le(&file[8])};
-    if (sample.ends_with(".bmp")) {
-        const auto height = static_cast<int32_t>(read_u32le(&file[22]));
-        return {read_u32le(&file[18]), static_cast<uint32_t>(std::abs(height))};
-    }
-    uint32_t sides[2] = {};
-    size_t at = 2;
-    for (uint32_t &side : sides)
-        do
-            side = side << 7 | (file[at] & 127);
-        while ((file[at++] & 128) != 0);
-    return {sides[0], sides[1]};
 }
 
 std::vector<Way> ways_of(const Sample &sample) {
@@ -117,7 +77,7 @@ std::vector<uint32_t> kinds_of(const Sample &sample) {
 }
 
 Blocks expected_blocks(const Sample &sample, const Asking &asking, Way way, const Decoded &decoded) {
-    const Size size = size_of(sample);
+    const SampleSize size = size_of(sample);
     const auto scaled_width = static_cast<uint32_t>(decoded.output_width);
     if (sample.ends_with(".png")) return png_blocks(sample.bytes, size, asking.kind, scaled_width);
     if (sample.ends_with(".gif")) return gif_blocks(size, way);
@@ -138,7 +98,7 @@ TEST_F(SamplesMemory, every_decode_takes_what_is_stated_and_gives_it_back) {
     for (const Sample &sample : all)
         for (const uint32_t kind : kinds_of(sample))
             for (const Way way : ways_of(sample)) {
-                const Size size = size_of(sample);
+                const SampleSize size = size_of(sample);
                 const auto width = static_cast<int32_t>(size.width), height = static_cast<int32_t>(size.height);
                 for (const Asking &asking :
                      {Asking{kind, 1, 0, width, height}, Asking{kind, 7, 0, width / 2, height / 2, 40},
