@@ -13,6 +13,10 @@
 namespace pelm {
 namespace {
 
+void clear_sums(const PngDecodeState &state) {
+    ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
+}
+
 void unpack_row(const PngDecodeState &state) {
     uint32_t *const words = state.resizeRowAccum;
     const auto width = static_cast<int32_t>(state.imageWidth);
@@ -42,7 +46,14 @@ void write_finished_row(const PngDecodeState &state) {
     const int64_t position = first_pixel_position(state) + row * steps.row;
     write_row_clipped(state.output, position, steps.pixel, state.outputFormat, WeightedRow{state.resizeOutAccum}, 0,
                       static_cast<int32_t>(state.scaledWidth));
-    ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
+    clear_sums(state);
+}
+
+void bring_sums_up_to_date(PngDecodeState &state) {
+    if (state.sums == PNG_SUMS_HOLD) return;
+    clear_sums(state);
+    if (state.sums == PNG_SUMS_LACK_A_LINE) add_sample_line(state, 0);
+    state.sums = PNG_SUMS_HOLD;
 }
 
 // The source row that holds the sample line that comes next.
@@ -63,18 +74,18 @@ void count_sampled_rows(PngDecodeState &state, uint64_t source_row) {
     state.resizeState = started > finished ? 1 : 0;
 }
 
-// Passes over a source row of which nothing can be seen, without walking through the output rows that it finishes. The
-// row in progress must be right all the same: a later call may show it.
+// Passes over a source row of which nothing can be seen, without walking through the output rows that it finishes, or
+// along them. What the row in progress needs of it is kept: a later call may show it.
 void pass_over_row(PngDecodeState &state) {
     const uint32_t finished_before = state.rowsDone;
     const uint32_t line_before = state.resizeState;
     count_sampled_rows(state, state.rowsWritten);
     if (state.resizeRowAccum == nullptr || state.resizeOutAccum == nullptr) return;
     const bool finished_some = state.rowsDone != finished_before;
-    if (finished_some) ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
+    if (finished_some) state.sums = PNG_SUMS_ARE_OLD;
     if (state.resizeState == 0 || (line_before != 0 && !finished_some)) return;
     unpack_row(state);
-    add_sample_line(state, 0);
+    state.sums = PNG_SUMS_LACK_A_LINE;
 }
 
 } // namespace
@@ -85,6 +96,7 @@ void reduce_row(PngDecodeState &state) {
         return pass_over_row(state);
     if (state.rowsDone >= state.scaledHeight || next_sampled_row(state) != source_row) return;
 
+    bring_sums_up_to_date(state);
     unpack_row(state);
     do {
         add_sample_line(state, state.resizeState);

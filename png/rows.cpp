@@ -118,7 +118,7 @@ void restart_rows(PlainRows &rows) {
     PngDecodeState &state = *rows.state;
     restart_state(state);
     ZOTARPELM_OsMemset(state.rowBefore, 0, state.rowLength);
-    if (state.resizeOutAccum != nullptr) ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
+    state.sums = PNG_SUMS_ARE_OLD;
 }
 
 void restart_rows(Adam7Rows &rows) {

@@ -27,6 +27,14 @@ constexpr uint32_t IDAT_TABLE_STEP = 2048; // entries
 enum : uint32_t { PNG_SEEN_IHDR = 1, PNG_SEEN_PLTE = 2 };
 enum : uint32_t { PNG_HAS_TRNS = 0x1000 };
 
+// The sums of the output row in progress. While nothing can be seen they are not brought up to date: a later call may
+// want them, and makes up for it.
+enum : uint32_t {
+    PNG_SUMS_HOLD = 0,
+    PNG_SUMS_ARE_OLD = 1,    // to be cleared
+    PNG_SUMS_LACK_A_LINE = 2 // to be cleared; then line 0, from the row in resizeRowAccum, comes first
+};
+
 // One IDAT chunk.
 struct PngIdatEntry {
     uint32_t length; // of its data; streams count it down as they read
@@ -62,7 +70,7 @@ struct FinishedColours;
 }
 
 // Fills the record up to the size that hosts of 32-bit systems account for.
-constexpr size_t png_state_fill = 151;
+constexpr size_t png_state_fill = 150;
 
 // Allocated with ZOTARPELM_OsMalloc and zeroed.
 struct PngDecodeState {
@@ -121,6 +129,7 @@ struct PngDecodeState {
     OutputBuffer output; // of the current call
     uint32_t exactRows;  // rows of scaledWidth pixels that an exact buffer has
     uint32_t bandBase;   // output row that the first row of the current call's buffer shows (scaled)
+    uint32_t sums;       // PNG_SUMS_: what resizeOutAccum is worth
     uint32_t reserved[png_state_fill];
 
     PngSamplePoint samplePoints[4];

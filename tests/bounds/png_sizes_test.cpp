@@ -90,5 +90,22 @@ TEST_F(PngSizes, square_headers_around_the_wrap_give_the_result_of_their_wrapped
             expect_stated(layout, side, side);
 }
 
+// A picture one pixel wide, stretched to a million: rows that are not written cost what the file's rows do.
+TEST_F(PngSizes, a_wide_box_without_a_buffer_costs_nothing_in_width) {
+    for (const uint8_t colour_type : {uint8_t{2}, uint8_t{0}})
+        for (const int32_t height : {500, 2000, 7000}) {
+            Png png{.width = 1, .height = 2000, .colour_type = colour_type, .depth = 8};
+            png.rows = noise_rows(png, 1);
+            const Bytes file = build(png);
+            for (const Way way : png_ways) {
+                Asking asking{PELM_SOURCE_MEMORY, 7, PELM_PLACE_STRETCH, 1000000, height};
+                asking.has_output = false;
+                reset_work();
+                EXPECT_EQ(decode(file, way, asking).result, 1) << name_of(way);
+                EXPECT_LT(work().bytes_moved, 1000000u) << name_of(way) << ", " << height;
+            }
+        }
+}
+
 } // namespace
 } // namespace pelm::test
