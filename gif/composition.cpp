@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "frame/host.h"
+#include "gif/row_writers.h"
 #include "gif/working.h"
 
 namespace pelm {
@@ -53,7 +54,9 @@ void paint_row(const GifDecoderState &state, const FrameRow &row) {
 int32_t PELMI_MakeFrameLineBuffer(GifDecoderState *state) {
     if (state->sourceRow >= state->screenHeight) return 1;
     uint32_t *const canvas = state->canvas + static_cast<ptrdiff_t>(state->sourceRow) * state->screenWidth;
-    ZOTARPELM_OsMemcpy(state->rowBuffer, canvas, static_cast<uint32_t>(state->screenWidth) * 4);
+    // What lies beside the frame counts only where the row can be seen: a frame of a few bytes may have 65535 rows.
+    if (pelm::is_shown(pelm::shown_rows(*state)))
+        ZOTARPELM_OsMemcpy(state->rowBuffer, canvas, static_cast<uint32_t>(state->screenWidth) * 4);
     const int32_t columns = std::min(state->imageWidth, state->screenWidth - state->imageLeft);
     if (columns <= 0) return 1;
     pelm::paint_row(*state, {state->pixelBuffer, state->activeTable, state->rowBuffer + state->imageLeft,

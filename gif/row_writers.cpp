@@ -16,27 +16,38 @@ bool always_steps_forward(uint32_t format) {
 // The screen's row, pixel for pixel.
 template <class Load>
 void write_one_to_one(const GifDecoderState &state, intptr_t start, const Load &load) {
-    if (state.sourceRow >= state.screenHeight) return;
+    if (!is_shown(shown_rows(state))) return;
     const OutputRow row = output_row(state, start, state.sourceRow);
     const int64_t step = always_steps_forward(state.outputFormat) ? 4 : row.step;
     write_row_clipped(state.output, row.position, step, state.outputFormat, load, 0, state.screenWidth);
 }
 
-// The output rows that show the screen's row: none or one, and several where the image is enlarged.
 template <class Load>
 void write_scaled(const GifDecoderState &state, intptr_t start, const Load &load, int32_t pixels) {
-    if (state.sourceRow >= state.screenHeight || state.output.size == 0 || state.scaledHeight <= 0) return;
-    const int64_t height = state.screenHeight;
-    const int64_t half = height >> 1;
-    // Output row k shows screen row (k x height + half) / scaledHeight.
-    const int64_t from = int64_t{state.sourceRow} * state.scaledHeight - half;
-    const int64_t behind = from + state.scaledHeight;
-    const int64_t first = from <= 0 ? 0 : (from + height - 1) / height;
-    for (int64_t k = first; k * height < behind; ++k) {
+    const ShownRows rows = shown_rows(state);
+    for (int64_t k = rows.first; k < rows.end; ++k) {
         const OutputRow row = output_row(state, start, k);
         write_samples(state, row.position, row.step, load, pixels, state.scaledWidth);
     }
 }
+
+} // namespace
+
+ShownRows shown_rows(const GifDecoderState &state) {
+    const int64_t row = state.sourceRow;
+    if (row >= state.screenHeight || state.output.size == 0) return {0, 0};
+    if (state.oneToOne != 0) return {row, row + 1};
+    if (state.scaledHeight <= 0) return {0, 0};
+    const int64_t height = state.screenHeight;
+    const int64_t half = height >> 1;
+    // Output row k shows screen row (k x height + half) / scaledHeight.
+    const int64_t from = row * state.scaledHeight - half;
+    const int64_t behind = from + state.scaledHeight;
+    const auto first_at = [height](int64_t place) { return place <= 0 ? 0 : (place + height - 1) / height; };
+    return {first_at(from), first_at(behind)};
+}
+
+namespace {
 
 IndexedRow still_row(GifDecoderState &state) {
     return {state.pixelBuffer, finished_colours(state)};

@@ -14,6 +14,17 @@ struct OutputRow {
     int64_t step;     // from pixel to pixel
 };
 
+// The output rows that show the screen's row `sourceRow`: none or one, and several where the image is enlarged.
+struct ShownRows {
+    int64_t first, end;
+};
+
+ShownRows shown_rows(const GifDecoderState &state);
+
+constexpr bool is_shown(ShownRows rows) {
+    return rows.first < rows.end;
+}
+
 inline OutputRow output_row(const GifDecoderState &state, intptr_t start, int64_t row) {
     const int32_t unit = gif_step_unit(state.outputFormat);
     return {start + row * state.rowStep * unit, int64_t{state.pixelStep} * unit};

@@ -112,5 +112,30 @@ TEST_F(GifRepetition, what_says_nothing_costs_no_more_than_ordinary_data) {
         }
 }
 
+// As many rows as there are, each without pixels, in 13 bytes.
+TEST_F(GifRepetition, frames_without_pixels_move_no_more_of_the_canvas_than_the_box_shows) {
+    constexpr uint16_t side = 3000;
+    constexpr uint64_t top_up = 16384; // at most, before every image
+    const Bytes frame{0x2C, 0, 0, 0, 0, 0, 0, side & 0xFF, side >> 8, 0, 0, 1, 0};
+    const auto file_of = [&](int frames) {
+        GifFile file;
+        file.screen(side, side, distinct_table(4));
+        for (int i = 0; i < frames; ++i)
+            file.raw(frame);
+        return file.trailer().bytes;
+    };
+    const Bytes one = file_of(1), many = file_of(101);
+    for (const Way way : {Way::frames, Way::frames_iterative})
+        for (const int32_t box : {0, 8, 30}) {
+            Asking asking{PELM_SOURCE_MEMORY, 7, 0, box, box};
+            asking.has_output = box != 0;
+            if (box == 0) asking.width = asking.height = 30;
+            const Work first = work_of(one, way, asking, "one frame");
+            const Work all = work_of(many, way, asking, "many frames");
+            const uint64_t shown = static_cast<uint64_t>(box) * side * 4;
+            EXPECT_LE(all.bytes_moved - first.bytes_moved, 100 * (shown + top_up)) << name_of(way) << ", " << box;
+        }
+}
+
 } // namespace
 } // namespace pelm::test
