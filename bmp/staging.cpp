@@ -36,7 +36,8 @@ bool open_staging(Staging &staging, const BmpState &state, int64_t offset) {
 
 int32_t fill_staging(Staging &staging, int32_t held) {
     const int32_t room = staging.capacity - held;
-    const int32_t got = ZOTARPELM_Read_IO(staging.input, staging.bytes + held, room);
+    // Another decode over the same source, in between, takes the buffer away.
+    const int32_t got = staging.bytes == nullptr ? 0 : ZOTARPELM_Read_IO(staging.input, staging.bytes + held, room);
     if (got >= 1) return std::min(got, room);
     staging.result = staging.input->consumed == staging.input->size ? PELM_RESULT_DONE : PELM_RESULT_DATA_ENDED;
     return 0;

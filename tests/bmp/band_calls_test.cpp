@@ -211,6 +211,28 @@ TEST_F(BmpBandCalls, a_memory_source_that_has_lost_its_data_fails_and_keeps_the_
     EXPECT_EQ(info.decoderState, nullptr);
 }
 
+// A call that is refused for want of memory takes the source's staging buffer with it: another decode of the request
+// finds none, reads nothing more, and ends.
+TEST_F(BmpBandCalls, another_decode_that_fails_in_between_leaves_nothing_to_read_into) {
+    TestSource source(PELM_SOURCE_STREAM, file_bytes(noise_bmp(rgb24, 9, 7, false)), 30);
+    ImageDecodeInfo info{};
+    info.input = &source.source;
+    info.outputFormat = 1;
+    Bytes output(189, background);
+    ASSERT_EQ(ZOTARPELMI_DecodeBMPIterLine(&info, output.data(), 9, 7, 3), 1);
+    const void *const state = info.decoderState;
+    const Bytes before = output;
+    host.faults.failing_allocation = static_cast<int>(host.allocations.size()) + 3; // record, staging, accumulators
+    EXPECT_EQ(ZOTARPELMI_DecodeBMP(&info, output.data(), 9, 7), 0);
+    ASSERT_EQ(info.decoderState, state);
+    ASSERT_EQ(source.source.data, nullptr);
+    EXPECT_EQ(ZOTARPELMI_DecodeBMPIterLine(&info, output.data(), 9, 7, 4), 1);
+    EXPECT_EQ(info.decoderState, nullptr);
+    EXPECT_EQ(output, before);
+    EXPECT_EQ(host.live_blocks(), std::vector<uint32_t>{28}) << "the first staging buffer is lost";
+    EXPECT_TRUE(host.violations.empty()) << host.violations.front();
+}
+
 TEST_F(BmpBandCalls, aborting_frees_nothing) {
     for (const uint32_t kind : seekable_kinds)
         for (const char *name : {"eight_bits", "twenty_four_bits"}) {
