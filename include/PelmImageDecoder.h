@@ -4,8 +4,10 @@
  * A decode is one request (ImageDecodeInfo) that names an input (InputSource), an output format, a rotation and a
  * placement; a call decodes it straight into a buffer of the caller. Zero both records before the first use. The
  * InputSource stays where it is, and open, from a decode's first call to its end, and `decoderState` is passed only to
- * calls of the family that has set it: nothing checks that. A one-shot call for BMP, or ZOTARPELMI_PreInitBMP, during
- * another decode of the same request loses that one's memory.
+ * calls of the family that has set it: nothing checks that. `outputFormat` and `flags` count on a decode's first call
+ * only: its later calls write what that one asked for, whatever they say. While a decode is in progress its source is
+ * not for other calls: they move it, and of a BMP a one-shot call or ZOTARPELMI_PreInitBMP takes the buffers away, so
+ * that memory is lost and rows are missing.
  * The library allocates, reads and polls only through the host services that PelmHost.h declares.
  *
  * Every call runs on the caller's thread. Decodes with separate requests and sources never disturb each other.
@@ -163,12 +165,13 @@ PELM_API int32_t ZOTARPELMI_DecodeBMPIter(ImageDecodeInfo *info, void *output, i
 PELM_API int32_t ZOTARPELMI_AbortBMPIter(ImageDecodeInfo *info);
 
 /*
- * The same in bands, each into a buffer of its own: `output` has outWidth x `rows` pixels (fewer rows when fewer
- * remain), and the band begins in its first row, centred horizontally only. Never turned; of the placements only
- * PELM_PLACE_STRETCH counts. `rows` may differ from call to call; 0 or fewer decode nothing.
- * PELM_RESULT_DONE, or PELM_RESULT_DATA_ENDED when a read failed before the band was complete; and then `decoderState`
- * is NULL when the image is complete. PELM_RESULT_FAILED for what is refused and without memory (no decode is in
- * progress then), and when the source is gone (then it still is).
+ * The same in bands, each into a buffer of its own, which is this call's alone (a decode that it has begun writes
+ * nothing by the calls above): `output` has outWidth x `rows` pixels (fewer rows when fewer remain), and the band
+ * begins in its first row, centred horizontally only. Never turned; of the placements only PELM_PLACE_STRETCH counts.
+ * `rows` may differ from call to call; 0 or fewer decode nothing. PELM_RESULT_DONE, or PELM_RESULT_DATA_ENDED when a
+ * read failed before the band was complete; and then `decoderState` is NULL when the image is complete.
+ * PELM_RESULT_FAILED for what is refused and without memory (no decode is in progress then), and when the source is
+ * gone (then it still is).
  */
 PELM_API int32_t ZOTARPELMI_DecodeBMPLine(ImageDecodeInfo *info, void *output, int32_t outWidth, int32_t outHeight,
                                           int32_t rows);
@@ -230,7 +233,8 @@ PELM_API int32_t ZOTARPELMI_DecodePNGIter(ImageDecodeInfo *info, void *output, i
  * goes as for ZOTARPELMI_DecodePNGIter. 0 keeps the limit of the call before, below 0 there is none. `output` is the
  * WHOLE BOX in every call, never a buffer of `rows` rows: pixel for pixel rows go where they belong; of a reduced image
  * each call's rows begin where the image begins, behind the margins and turned as the flags say. `rows` counts output
- * rows (of grey of 8 bits, source rows that are used); where an image is stretched a call may write some more.
+ * rows (of grey of 8 bits, source rows that are used); where an image is stretched a call may write more, and a limit
+ * that comes to the image's own height ends no call.
  * Interlaced images take 0 rows only, or as many as info->imageHeight says. */
 PELM_API int32_t ZOTARPELMI_DecodePNGLine(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
                                           int32_t rows);
@@ -258,7 +262,8 @@ PELM_API int32_t PELMI_FastImgDestroyPngTrInfo(PngTrInfo *record);
  * The first image of a GIF, drawn from the left edge of the logical screen on, in formats 0, 1, 5, 7, 8, 10, 11 and 12.
  * The screen's size decides the size in the output. Transparent pixels show their colour; hasTransparency tells of
  * them. When globalColorTable is not NULL every colour table is copied there as it is in the file (768 bytes at most).
- * docs/formats.md lists what is refused, docs/oddities.md what may surprise.
+ * docs/formats.md lists what is refused, docs/oddities.md what may surprise. In slices (ZOTARPELMI_DecodeAGIFIter too)
+ * the word of the first call holds until the end: the block stays with the request as long.
  *
  * A decode that one kind of call has begun goes on with the same kind only: another one gives 0 and leaves it. Do not
  * hand over a decoderState of another image format.
@@ -269,8 +274,9 @@ PELM_API int32_t PELMI_FastImgDestroyPngTrInfo(PngTrInfo *record);
  * malformed, between its header and its first image LEAKS the decode's memory: nothing can free it. */
 PELM_API int32_t ZOTARPELMI_DecodeGIF(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
 
-/* About 16 rows per call: PELM_RESULT_MORE until the image has ended, then PELM_RESULT_DONE or PELM_RESULT_FAILED. The
- * first call decodes no row; the output arguments of later ones are not looked at. Leaks as ZOTARPELMI_DecodeGIF. */
+/* About 16 rows per call, of narrow images more (one code may be 4096 pixels): PELM_RESULT_MORE until the image has
+ * ended, then PELM_RESULT_DONE or PELM_RESULT_FAILED. The first call decodes no row; the output arguments of later ones
+ * are not looked at. Leaks as ZOTARPELMI_DecodeGIF. */
 PELM_API int32_t ZOTARPELMI_DecodeGIFIter(ImageDecodeInfo *info, void *outBuffer, int32_t outWidth, int32_t outHeight);
 
 /* Gives up a decode in progress and frees all of it. 1, or 0 for a NULL `info`. */
