@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "frame/host.h"
+#include "gif/composition.h"
 #include "gif/row_writers.h"
 #include "gif/working.h"
 
@@ -48,18 +49,25 @@ void paint_row(const GifDecoderState &state, const FrameRow &row) {
     }
 }
 
+void compose(const GifDecoderState &state, bool with_columns_beside) {
+    if (state.sourceRow >= state.screenHeight) return;
+    uint32_t *const canvas = state.canvas + static_cast<ptrdiff_t>(state.sourceRow) * state.screenWidth;
+    if (with_columns_beside) ZOTARPELM_OsMemcpy(state.rowBuffer, canvas, static_cast<uint32_t>(state.screenWidth) * 4);
+    const int32_t columns = std::min(state.imageWidth, state.screenWidth - state.imageLeft);
+    if (columns <= 0) return;
+    paint_row(state, {state.pixelBuffer, state.activeTable, state.rowBuffer + state.imageLeft, canvas + state.imageLeft,
+                      columns});
+}
+
 } // namespace
+
+void compose_to_be_shown(const GifDecoderState &state) {
+    compose(state, is_shown(shown_rows(state)));
+}
+
 } // namespace pelm
 
 int32_t PELMI_MakeFrameLineBuffer(GifDecoderState *state) {
-    if (state->sourceRow >= state->screenHeight) return 1;
-    uint32_t *const canvas = state->canvas + static_cast<ptrdiff_t>(state->sourceRow) * state->screenWidth;
-    // What lies beside the frame counts only where the row can be seen: a frame of a few bytes may have 65535 rows.
-    if (pelm::is_shown(pelm::shown_rows(*state)))
-        ZOTARPELM_OsMemcpy(state->rowBuffer, canvas, static_cast<uint32_t>(state->screenWidth) * 4);
-    const int32_t columns = std::min(state->imageWidth, state->screenWidth - state->imageLeft);
-    if (columns <= 0) return 1;
-    pelm::paint_row(*state, {state->pixelBuffer, state->activeTable, state->rowBuffer + state->imageLeft,
-                             canvas + state->imageLeft, columns});
+    pelm::compose(*state, true);
     return 1;
 }

@@ -3,6 +3,7 @@
 
 #include "frame/sizes.h"
 #include "gif/colours.h"
+#include "gif/composition.h"
 #include "gif/input.h"
 #include "gif/line_rows.h"
 #include "gif/lzw/loop.h"
@@ -25,7 +26,7 @@ struct WholeImage {
     intptr_t start;
 
     Taken take_row(GifDecoderState &state) const {
-        if (state.animated != 0) PELMI_MakeFrameLineBuffer(&state);
+        if (state.animated != 0) compose_to_be_shown(state);
         return PELMI_WriteTheLine(&state, start) != 0 ? Taken::next : Taken::failed;
     }
     // Whether the call ends once the buffer holds no complete row.
