@@ -20,6 +20,7 @@ bool make_reader(PngDecodeState &state, InputSource &source) {
 void allocate_accumulators(PngDecodeState &state) {
     state.resizeRowAccum = allocate_array<uint32_t>(state.imageWidth);
     state.resizeOutAccum = allocate_array<uint32_t>(state.scaledWidth);
+    if (state.resizeOutAccum != nullptr) ZOTARPELM_OsMemset(state.resizeOutAccum, 0, state.scaledWidth * 4);
 }
 
 // PNG_ROWS_REMAIN when there is an image to decode; otherwise the driver's result, with the state gone.

@@ -2,6 +2,7 @@
 #include "tests/bounds/ways.h"
 #include "tests/bounds/work.h"
 #include "tests/png/support/png_builder.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -53,7 +54,8 @@ std::vector<Asking> askings(uint32_t kind) {
 void expect_stated(const Layout &layout, uint32_t width, uint32_t height) {
     for (const uint8_t interlace : {uint8_t{0}, uint8_t{1}}) {
         const Bytes file = file_of(layout, width, height, interlace);
-        for (const uint32_t kind : every_kind)
+        for (const uint32_t kind : every_kind) {
+            if (quick() && (kind == PELM_SOURCE_SEQUENTIAL) != (interlace != 0)) continue;
             for (const Asking &asking : askings(kind))
                 for (const Way way : png_ways) {
                     reset_work();
@@ -71,6 +73,7 @@ void expect_stated(const Layout &layout, uint32_t width, uint32_t height) {
                     EXPECT_LT(work().peak_bytes, most_alive) << what;
                     EXPECT_TRUE(left_nothing()) << what;
                 }
+        }
     }
 }
 
@@ -90,7 +93,8 @@ TEST_F(PngSizes, square_headers_around_the_wrap_give_the_result_of_their_wrapped
             expect_stated(layout, side, side);
 }
 
-// A picture one pixel wide, stretched to a million: rows that are not written cost what the file's rows do.
+// A picture one pixel wide, stretched to a million: the sums are cleared once, and rows that are not written cost what
+// the file's rows do.
 TEST_F(PngSizes, a_wide_box_without_a_buffer_costs_nothing_in_width) {
     for (const uint8_t colour_type : {uint8_t{2}, uint8_t{0}})
         for (const int32_t height : {500, 2000, 7000}) {
@@ -102,7 +106,7 @@ TEST_F(PngSizes, a_wide_box_without_a_buffer_costs_nothing_in_width) {
                 asking.has_output = false;
                 reset_work();
                 EXPECT_EQ(decode(file, way, asking).result, 1) << name_of(way);
-                EXPECT_LT(work().bytes_moved, 1000000u) << name_of(way) << ", " << height;
+                EXPECT_LT(work().bytes_moved, 5000000u) << name_of(way) << ", " << height;
             }
         }
 }
