@@ -4,6 +4,7 @@
 
 #include "bmp/working.h"
 #include "tests/bmp/bands.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -56,7 +57,7 @@ TEST_F(BmpBandCalls, rows_farther_than_any_buffer_reaches_are_not_written) {
 }
 
 // In a buffer of its unturned size a turned image's rows begin far above or below it, later ones beyond what 32 bits
-// count, and still run through it.
+// count, and still run through it. Of interest on 32-bit systems.
 TEST_F(BmpBandCalls, rows_of_turned_images_that_begin_far_outside_are_those_of_one_call) {
     const struct {
         int32_t width, height;
@@ -65,6 +66,7 @@ TEST_F(BmpBandCalls, rows_of_turned_images_that_begin_far_outside_are_those_of_o
     } images[] = {{46409, 135, 0, 1}, {46273, 137, 0, 3}, {37694, 288, 1, 3}};
     for (const auto &[width, height, format, turns] : images)
         for (const bool top_down : {false, true}) {
+            if (quick() && (top_down || turns == 1)) continue;
             const BmpRequest request{format, turns, PELM_PLACE_EXACT, height, width};
             const Bytes file = file_bytes(noise_bmp(variant_named("one_bit"), width, height, top_down));
             const size_t size = static_cast<size_t>(width) * static_cast<size_t>(height) * (format == 0 ? 2 : 3);

@@ -18,6 +18,7 @@ std::vector<int32_t> buffer_sizes(int32_t stride) {
 TEST_F(BmpSources, streams_give_the_pixels_that_memory_gives) {
     for (const BmpVariant &variant : bmp_variants)
         for (const bool top_down : {false, true}) {
+            if (quick() && top_down != (variant.bits <= 8)) continue;
             const BmpFile file = noise_bmp(variant, 11, 13, top_down);
             for (const uint32_t kind : stream_kinds)
                 for (const int32_t buffer_size : buffer_sizes(static_cast<int32_t>(file.stride()))) {

@@ -113,7 +113,7 @@ TEST_F(GifRepetition, what_says_nothing_costs_no_more_than_ordinary_data) {
 }
 
 // As many rows as there are, each without pixels, in 13 bytes.
-TEST_F(GifRepetition, frames_without_pixels_move_no_more_of_the_canvas_than_the_box_shows) {
+TEST_F(GifRepetition, frames_without_pixels_move_no_more_rows_of_the_canvas_than_the_box_shows) {
     constexpr uint16_t side = 3000;
     constexpr uint64_t top_up = 16384; // at most, before every image
     const Bytes frame{0x2C, 0, 0, 0, 0, 0, 0, side & 0xFF, side >> 8, 0, 0, 1, 0};

@@ -1,4 +1,5 @@
 // Size and place: margins, aspect, flags, and boxes at the edge of sense.
+#include "tests/support/quick.h"
 #include "tests/wbmp/decoding.h"
 
 namespace pelm::test {
@@ -134,6 +135,9 @@ TEST_F(WbmpPlacement, ratios_are_compared_in_single_precision) {
 }
 
 TEST_F(WbmpPlacement, a_row_that_rounding_adds_below_the_box_is_dropped) {
+#ifndef __i386__ // whose processor rounds in its own way
+    if (quick()) return;
+#endif
     constexpr int32_t height = 33554440;
     constexpr int32_t box_height = 16777219;
     Bytes bytes = file_bytes(blank_wbmp(2, height));

@@ -1,5 +1,6 @@
 // Image data: codes right and wrong, and the sub-blocks that they are cut into.
 #include "tests/gif/support/gif_check.h"
+#include "tests/support/quick.h"
 
 namespace pelm::test {
 namespace {
@@ -168,6 +169,7 @@ TEST_F(GifCodes, a_string_of_more_than_4096_pixels_counts_as_code_zero) {
     const Codes longest = {2055};                                       // 4096 and one more
     for (const Codes &behind : {Codes{2055, 9}, Codes{2055, 2056, 9, 2057}, Codes{2056, 9, 2056, 2057},
                                 Codes{2056, 2057, 2058, 2055, 7}, Codes{9, 2055, 2055, 2060, 2060}}) {
+        if (quick() && behind.size() != 4) continue;
         Codes all = codes;
         all.insert(all.end(), longest.begin(), longest.end());
         all.insert(all.end(), behind.begin(), behind.end());
