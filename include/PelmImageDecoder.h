@@ -5,10 +5,10 @@
  * placement; a call decodes it straight into a buffer of the caller. Zero both records before the first use. The
  * InputSource stays where it is, and open, from a decode's first call to its end, and `decoderState` is passed only to
  * calls of the family that has set it: nothing checks that. `outputFormat` and `flags` count on a decode's first call
- * only: its later calls write what that one asked for, whatever they say. While a decode is in progress its source is
- * not for other calls: they move it, and of a BMP a one-shot call or ZOTARPELMI_PreInitBMP takes the buffers away, so
- * that memory is lost and rows are missing.
- * The library allocates, reads and polls only through the host services that PelmHost.h declares.
+ * only (in two steps on the second one): its later calls write what that one asked for, whatever they say. While a
+ * decode is in progress its source is not for other calls: they move it, and a one-shot call for BMP or WBMP takes a
+ * stream's buffer away, so that memory is lost and rows are missing. ZOTARPELMI_PreInitBMP loses the decode of its
+ * request. The library allocates, reads and polls only through the host services that PelmHost.h declares.
  *
  * Every call runs on the caller's thread. Decodes with separate requests and sources never disturb each other.
  */
@@ -232,10 +232,10 @@ PELM_API int32_t ZOTARPELMI_DecodePNGIter(ImageDecodeInfo *info, void *output, i
 /* Up to `rows` further rows: PELM_RESULT_MORE while rows remain, then PELM_RESULT_DONE or PELM_RESULT_FAILED; the state
  * goes as for ZOTARPELMI_DecodePNGIter. 0 keeps the limit of the call before, below 0 there is none. `output` is the
  * WHOLE BOX in every call, never a buffer of `rows` rows: pixel for pixel rows go where they belong; of a reduced image
- * each call's rows begin where the image begins, behind the margins and turned as the flags say. `rows` counts output
- * rows (of grey of 8 bits, source rows that are used); where an image is stretched a call may write more, and a limit
- * that comes to the image's own height ends no call.
- * Interlaced images take 0 rows only, or as many as info->imageHeight says. */
+ * each call's rows begin where the image begins, behind the margins and turned as images of its kind are. `rows` counts
+ * output rows (of grey of 8 bits, source rows that are used); where an image is stretched a call may write more, and a
+ * limit that comes to the image's own height ends no call. Interlaced images take 0 rows only, or as many as
+ * info->imageHeight says. */
 PELM_API int32_t ZOTARPELMI_DecodePNGLine(ImageDecodeInfo *info, void *output, int32_t boxWidth, int32_t boxHeight,
                                           int32_t rows);
 
