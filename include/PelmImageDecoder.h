@@ -3,12 +3,12 @@
  *
  * A decode is one request (ImageDecodeInfo) that names an input (InputSource), an output format, a rotation and a
  * placement; a call decodes it straight into a buffer of the caller. Zero both records before the first use. The
- * InputSource stays where it is, and open, from a decode's first call to its end, and `decoderState` is passed only to
- * calls of the family that has set it: nothing checks that. `outputFormat` and `flags` count on a decode's first call
- * only (in two steps on the second one): its later calls write what that one asked for, whatever they say. While a
- * decode is in progress its source is not for other calls: they move it, and a one-shot call for BMP or WBMP takes a
- * stream's buffer away, so that memory is lost and rows are missing. ZOTARPELMI_PreInitBMP loses the decode of its
- * request. The library allocates, reads and polls only through the host services that PelmHost.h declares.
+ * InputSource stays where and as it is, and open, from a decode's first call to its end, and `decoderState` is passed
+ * only to calls of the family that has set it: nothing checks that. `outputFormat` and `flags` count on a decode's
+ * first call only (in two steps on the second one): its later calls write what that one asked for, whatever they say.
+ * While a decode is in progress its source is not for other calls: they move it, and a one-shot call for BMP or WBMP
+ * takes a stream's buffer away, so that memory is lost and rows are missing. ZOTARPELMI_PreInitBMP loses the decode of
+ * its request. The library allocates, reads and polls only through the host services that PelmHost.h declares.
  *
  * Every call runs on the caller's thread. Decodes with separate requests and sources never disturb each other.
  */
