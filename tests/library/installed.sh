@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# installed.sh BUILD_FOLDER CONFIGURATION WORK_FOLDER GENERATOR OPTION COMPILER [EMULATOR...]: what `cmake --install` leaves is found by CMake and
-# by pkg-config, wherever it lies, and a C program that links it, shared or static, decodes a sample. OPTION names the
-# build's toolchain file, if it has one, to CMake.
+# installed.sh BUILD_FOLDER CONFIGURATION WORK_FOLDER GENERATOR OPTION COMPILER [EMULATOR...]: what `cmake --install`
+# leaves is found by CMake and by pkg-config, wherever it lies, and a C program that links it, shared or static, decodes
+# a sample. OPTION names the build's toolchain file, if it has one, to CMake.
 set -euo pipefail
 root=$(cd "$(dirname "${BASH_SOURCE[0]}")/../.." && pwd)
 build=$1 configuration=$2 work=$3 generator=$4 option=$5 compiler=$6
